@@ -1,0 +1,16 @@
+// Owner of the event pipe, which wakes a caller when synthesized events wait.
+#pragma once
+
+#include "VEX_EVMONHandler.h"
+
+class EVMONEventPipeHandler : public EVMONHandler {
+ public:
+  EVMONEventPipeHandler(int32_t* fds, char* path);  // fds: read end, write end; both are taken over
+  ~EVMONEventPipeHandler() override;
+
+  Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
+  int32_t getWriteFd() { return evmon_pipe_write_fd; }
+
+ private:
+  int32_t evmon_pipe_write_fd;
+};

@@ -1,0 +1,42 @@
+// The configuration table: the one in-memory description of the cluster.
+#pragma once
+
+#include "hash.h"
+#include "hb_client/configuration.h"
+
+// Field order is fixed: tests and debuggers of other programs read the table as it lies in memory.
+struct Hb_Configuration_Internal {
+  Hb_Node_Number local_node_number;
+  int Hb_max_nodes;
+  int Hb_num_nodes;          // as loaded; the node-count query reports global_num_nodes
+  int Hb_adapters_per_node;  // also the number of network slots that the network queries range over
+  int Hb_num_adapters;
+  int Hb_num_networks;
+  int Hb_max_sites;
+  int Hb_num_sites;
+  timeval Hb_rem_node_down_sim_period;
+  timeval Hb_local_node_down_sim_period;
+  Hb_Adapter* Hb_global_adapter_list;  // Hb_num_adapters records, owned
+  Hb_Network Hb_global_network_list[HB_MAX_NETWORKS];
+  H_table_str* adap_hash;           // by adapter number
+  H_table_str* ip_hash;             // by address
+  H_table_str* node_hash;           // by node number
+  H_table_str* site_hash;           // filled by nothing
+  Hb_Node_config_state* node_list;  // HB_MAX_NODES records, owned
+  Hb_Site* site_list;
+};
+
+// Adapter numbers of a cluster are below this; 0 before a configuration is loaded.
+inline Hb_Adapter_Number adapter_number_limit(const Hb_Configuration_Internal& table) {
+  return static_cast<Hb_Adapter_Number>(table.Hb_adapters_per_node) *
+         static_cast<Hb_Adapter_Number>(table.Hb_max_nodes);
+}
+
+inline bool is_node_number(const Hb_Configuration_Internal& table, int node) {
+  return node >= 0 && node < table.Hb_max_nodes;
+}
+
+// A network number is checked against the adapters per node, which may be more than the slots that exist.
+inline bool is_network_number(const Hb_Configuration_Internal& table, int network) {
+  return network >= 0 && network < table.Hb_adapters_per_node;
+}

@@ -1,0 +1,49 @@
+#include "hb_global_data/node_table.h"
+
+namespace {
+
+bool has_configured_adapter(int node) {
+  const auto slots = static_cast<Hb_Adapter_Number>(global_config_tbl.Hb_adapters_per_node);
+  const Hb_Adapter_Number first = static_cast<Hb_Adapter_Number>(node) * slots;
+  for (Hb_Adapter_Number slot = 0; slot < slots; ++slot) {
+    if (Hash_search(first + slot, global_config_tbl.adap_hash) != nullptr) {
+      return true;
+    }
+  }
+  return false;
+}
+
+void free_and_forget(H_table_str*& table) {
+  if (table != nullptr) {
+    Hash_free(table);
+    table = nullptr;
+  }
+}
+
+}  // namespace
+
+void hb_init_global_node_tbl() {
+  int32_t count = 0;
+  for (int node = 0; node < global_config_tbl.Hb_max_nodes && node < HB_MAX_NODES; ++node) {
+    const bool present = has_configured_adapter(node);
+    global_node_tbl[node] = present ? Hb_True : Hb_False;
+    count += present ? 1 : 0;
+  }
+  global_num_nodes = count;
+}
+
+void hb_deinit_global_config_and_node_tbl() {
+  delete[] global_config_tbl.Hb_global_adapter_list;
+  global_config_tbl.Hb_global_adapter_list = nullptr;
+  delete[] global_config_tbl.node_list;
+  global_config_tbl.node_list = nullptr;
+  free_and_forget(global_config_tbl.adap_hash);
+  free_and_forget(global_config_tbl.ip_hash);
+  free_and_forget(global_config_tbl.node_hash);
+  global_num_nodes = 0;
+}
+
+Hb_Adapter* hb_get_adap_entry(Hb_Adapter_Number adap_num) {
+  void* adapter = Hash_search(adap_num, global_config_tbl.adap_hash);
+  return adapter != nullptr ? static_cast<Hb_Adapter*>(adapter) : &HB_INVALID_ADAP;
+}
