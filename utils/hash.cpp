@@ -92,7 +92,7 @@ void* insert(const Key& key, H_table_str* table, void* newitem) {
   }
   H_obj_str* last = nullptr;
   const int location = locate(key, table, &last);
-  if (location > 0) {
+  if (last != nullptr && location > 0) {
     void* previous = last->pointer;
     last->pointer = newitem;
     return previous;
@@ -151,14 +151,15 @@ struct Release {
 };
 
 template <typename T>
-std::unique_ptr<T, Release> allocate(size_t count) {
+std::unique_ptr<T, Release> allocate(size_t size) {
   void* block = nullptr;
-  cpp_malloc(&block, static_cast<int>(count * sizeof(T)), "Hash_init");
+  cpp_malloc(&block, static_cast<int>(size), "Hash_init");
   return std::unique_ptr<T, Release>(static_cast<T*>(block));
 }
 
 // Largest table whose bucket array has a size that cpp_malloc can be told.
-constexpr int maximum_size = INT32_MAX / static_cast<int>(sizeof(H_obj_str*));
+constexpr size_t bucket_size = sizeof(void*);
+constexpr int maximum_size = INT32_MAX / static_cast<int>(bucket_size);
 
 }  // namespace
 
@@ -169,10 +170,10 @@ H_table_str* Hash_init(const char* name, int size) {
   if (size > maximum_size) {
     throw std::bad_alloc();
   }
-  const auto count = static_cast<size_t>(size);
-  auto table = allocate<H_table_str>(1);
-  auto buckets = allocate<H_obj_str*>(count);
-  std::memset(buckets.get(), 0, count * sizeof(H_obj_str*));
+  const size_t buckets_size = static_cast<size_t>(size) * bucket_size;
+  auto table = allocate<H_table_str>(sizeof(H_table_str));
+  auto buckets = allocate<H_obj_str*>(buckets_size);
+  std::memset(buckets.get(), 0, buckets_size);
   table->size = size;
   table->entries = 0;
   table->name = copy_string(name);
@@ -244,7 +245,7 @@ void Hash_clean(H_table_str* table) {
     return;
   }
   for_each_entry(table, [](int32_t, H_obj_str* entry) { ccst_free(entry); });
-  std::memset(table->table, 0, static_cast<size_t>(table->size) * sizeof(H_obj_str*));
+  std::memset(table->table, 0, static_cast<size_t>(table->size) * bucket_size);
   table->entries = 0;
 }
 

@@ -92,17 +92,15 @@ void add_adapter(Tables& tables, const hb_configuration_header& header, Hb_Adapt
 }
 
 // Throws std::bad_alloc.
-Tables build(const hb_configuration_header& header, const Message& message) {
+void build(Tables& tables, const hb_configuration_header& header, const Message& message) {
   const auto count = static_cast<size_t>(header.num_adapters);
-  Tables tables;
-  tables.adapters.reset(new Hb_Adapter[count]);
+  tables.adapters = std::make_unique_for_overwrite<Hb_Adapter[]>(count);
   tables.by_number.reset(Hash_init("Hb_Adapter list", prime(header.num_adapters * 2)));
   tables.nodes_by_number.reset(Hash_init("preVEX_node list", prime(node_table_size)));
-  tables.nodes.reset(new Hb_Node_config_state[HB_MAX_NODES]());
+  tables.nodes = std::make_unique<Hb_Node_config_state[]>(HB_MAX_NODES);
   tables.by_address.reset(Hash_init("preVEX_Hb_IP list", prime(header.num_adapters * 2)));
   message.copy(tables.adapters.get(), sizeof header, count * sizeof(Hb_Adapter));
   std::for_each_n(tables.adapters.get(), count, [&](Hb_Adapter& adapter) { add_adapter(tables, header, adapter); });
-  return tables;
 }
 
 void install(Tables& tables, const hb_configuration_header& header, const Message& message) {
@@ -132,7 +130,8 @@ Hb_Rc load(const Message& message, Make_Room make_room) {
   }
   const auto header = message.at<hb_configuration_header>(0);
   try {
-    Tables tables = build(header, message);
+    Tables tables;
+    build(tables, header, message);
     make_room();
     install(tables, header, message);
   } catch (const std::bad_alloc&) {

@@ -6,6 +6,7 @@
 
 #include <cerrno>
 #include <cstddef>
+#include <cstdint>
 
 #include "hb_communication/connection.h"
 
@@ -77,7 +78,7 @@ Hb_Rc make_keys(Keys& keys) {
   return Hb_Success;
 }
 
-bool is_attached(const void* address) { return address != nullptr && address != reinterpret_cast<const void*>(-1); }
+bool is_attached(const void* address) { return address != nullptr && reinterpret_cast<intptr_t>(address) != -1; }
 
 template <typename Segment, size_t N>
 Hb_Rc attach(key_t key, size_t size, const Errno_Mapping (&get_errors)[N], int& id, Segment*& segment) {

@@ -10,13 +10,18 @@ bool is_ipv4_mapped(const in6_addr& address) {
   return address.s6_addr32[0] == 0 && address.s6_addr32[1] == 0 && address.s6_addr32[2] == htonl(0xFFFF);
 }
 
+template <size_t N>
+void copy_text(char* to, const char (&text)[N]) {
+  std::memcpy(to, text, N);
+}
+
 char* address_text(const in6_addr& address, char* out_p) {
   if (is_ipv4_mapped(address)) {
     if (inet_ntop(AF_INET, &address.s6_addr32[3], out_p, INET_ADDRSTRLEN) == nullptr) {
-      std::strcpy(out_p, "bad address 4");
+      copy_text(out_p, "bad address 4");
     }
   } else if (inet_ntop(AF_INET6, &address, out_p, INET6_ADDRSTRLEN) == nullptr) {
-    std::strcpy(out_p, "bad address 6");
+    copy_text(out_p, "bad address 6");
   }
   return out_p;
 }

@@ -12,11 +12,11 @@
 
 void hbapi_global_data_once_init() {
   pthread_mutexattr_t new_mutex_attrs;
-  HB_GLOBAL_DATA_ASSERT(pthread_mutexattr_init(&new_mutex_attrs) == 0);
-  HB_GLOBAL_DATA_ASSERT(pthread_mutexattr_settype(&new_mutex_attrs, PTHREAD_MUTEX_RECURSIVE) == 0);
-  HB_GLOBAL_DATA_ASSERT(pthread_mutex_init(&global_boot_ip_list_mutex, &new_mutex_attrs) == 0);
-  HB_GLOBAL_DATA_ASSERT(pthread_mutex_init(&event_queue_list_and_sequence_mutex, &new_mutex_attrs) == 0);
-  HB_GLOBAL_DATA_ASSERT(pthread_mutexattr_destroy(&new_mutex_attrs) == 0);
+  HB_GLOBAL_DATA_ASSERT_ZERO(pthread_mutexattr_init(&new_mutex_attrs));
+  HB_GLOBAL_DATA_ASSERT_ZERO(pthread_mutexattr_settype(&new_mutex_attrs, PTHREAD_MUTEX_RECURSIVE));
+  HB_GLOBAL_DATA_ASSERT_ZERO(pthread_mutex_init(&global_boot_ip_list_mutex, &new_mutex_attrs));
+  HB_GLOBAL_DATA_ASSERT_ZERO(pthread_mutex_init(&event_queue_list_and_sequence_mutex, &new_mutex_attrs));
+  HB_GLOBAL_DATA_ASSERT_ZERO(pthread_mutexattr_destroy(&new_mutex_attrs));
 }
 
 void hbapi_mutex_cleanup_handler(void* p_argument) { pthread_mutex_unlock(static_cast<pthread_mutex_t*>(p_argument)); }
