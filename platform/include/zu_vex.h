@@ -1,0 +1,90 @@
+/* libzu_vex: the operating system's cluster services and event monitors. */
+#ifndef ZU_VEX_H
+#define ZU_VEX_H
+
+#include <netinet/in.h>
+#include <stdint.h>
+
+#ifdef __cplusplus
+extern "C" {
+#define ZU_VEX_ENUM_BASE : int32_t
+#else
+#define ZU_VEX_ENUM_BASE
+#endif
+
+typedef uint32_t zu_vex_node_num_t;
+typedef uint32_t zu_vex_IP_address4_t;
+typedef char* zu_vex_intf_name_t;
+
+/** A 16-byte address in network byte order; IPv4 addresses are IPv4-mapped. */
+typedef union zu_vex_IP_address6_t {
+  struct {
+    uint32_t filler[3];
+    zu_vex_IP_address4_t v4_in_v6_ipv4;
+  } zu_vex_v4_in_v6;
+  struct in6_addr zu_vex_i6_ipv6;
+} zu_vex_IP_address6_t;
+
+typedef enum zu_vex_net_intf_dev_subtype_t ZU_VEX_ENUM_BASE {
+  ZU_VEX_DEVTYPE_UNSUPPORTED = 0,
+  ZU_VEX_DEVTYPE_ETHER = 1,
+  ZU_VEX_DEVTYPE_TOKENRING = 800,
+} zu_vex_net_intf_dev_subtype_t;
+
+typedef enum zu_vex_intf_status_t ZU_VEX_ENUM_BASE {
+  ZU_VEX_INTF_STATUS_UNDEF = -1,
+  ZU_VEX_INTF_STATUS_DOWN = 0,
+  ZU_VEX_INTF_STATUS_UP = 1,
+  ZU_VEX_INTF_STATUS_STALE = 2,
+} zu_vex_intf_status_t;
+
+typedef struct zu_vex_hwaddr_t {
+  uint8_t ieee802mac[6];
+} zu_vex_hwaddr_t;
+
+/** Bit of `flags`: the address is an alias, not a boot address. */
+#define ZU_VEX_INTF_ALIAS UINT64_C(0x2)
+
+/** One interface address of one node; a linked list. */
+typedef struct zu_vex_net_intf_info {
+  zu_vex_node_num_t node_number;
+  zu_vex_intf_name_t p_name; /**< at most 32 characters count */
+  zu_vex_IP_address6_t ip_addr;
+  zu_vex_IP_address6_t netmask;
+  uint64_t flags;
+  zu_vex_net_intf_dev_subtype_t type;
+  zu_vex_hwaddr_t hwaddr;
+  zu_vex_intf_status_t status;
+  uint32_t cfg_op;
+  void* caller_data;
+  struct zu_vex_net_intf_info* p_next;
+} zu_vex_net_intf_info_t;
+
+typedef struct zu_vex_uuid_t {
+  uint64_t high;
+  uint64_t low;
+} zu_vex_uuid_t;
+
+/** The cluster. */
+typedef struct zu_vex_cluster_info_t {
+  zu_vex_node_num_t local_node_number;
+  char* p_cluster_name;
+  char cluster_id[64];
+  zu_vex_uuid_t uuid;
+  uint32_t cluster_shid;
+  uint32_t cluster_type;
+} zu_vex_cluster_info_t;
+
+/*
+ * Each query returns 0 and hands out what it found, or another value and leaves the output alone. A platform without
+ * cluster services yields -1.
+ */
+int zu_vex_get_cluster_info(zu_vex_cluster_info_t** info);
+int zu_vex_get_net_intf_info(zu_vex_net_intf_info_t** list);
+int zu_vex_get_boot_addrs(zu_vex_net_intf_info_t** list);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif
