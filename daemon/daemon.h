@@ -1,0 +1,49 @@
+/* The daemon as a whole: source, model, published memory and clients, put together. */
+#ifndef HBD_DAEMON_H
+#define HBD_DAEMON_H
+
+#include <memory>
+#include <string>
+
+#include "change.h"
+#include "claim.h"
+#include "cluster.h"
+#include "loop.h"
+#include "membership_source.h"
+#include "request_handler.h"
+#include "server.h"
+
+namespace hbd {
+
+/** One daemon at one socket path. */
+class Daemon : public ChangeSink {
+ public:
+  /**
+   * Listens from here on, and answers once the loop runs.
+   *
+   * @param queue_bytes bytes that are kept for a client that does not read; two configurations are always kept.
+   * @throws Failure when the path cannot be had.
+   */
+  Daemon(Loop& loop, const std::string& path, MembershipSource& source, std::size_t queue_bytes);
+
+  /** Makes a change to the cluster, publishes it and tells the clients. */
+  void apply(const Change& change) override;
+
+  /** The clients. */
+  Server& server() { return server_; }
+  [[nodiscard]] const Cluster& cluster() const { return cluster_; }
+
+ private:
+  [[nodiscard]] memory_configuration_data published() const;
+  void keep_room_for_configurations();
+
+  std::size_t queue_bytes_;
+  Cluster cluster_;
+  RequestHandler handler_;
+  Claim claim_;
+  Server server_;
+};
+
+}  // namespace hbd
+
+#endif

@@ -1,0 +1,94 @@
+#include "output_queue.h"
+
+#include <sys/socket.h>
+#include <sys/uio.h>
+
+#include <cerrno>
+#include <optional>
+#include <span>
+#include <utility>
+
+namespace hbd {
+namespace {
+
+using Bytes = std::span<const std::uint8_t>;
+
+/* The frame in three pieces: before the name, the name, behind it; less the bytes that are sent. */
+std::array<iovec, 3> pieces(const Frame& frame, const SubscriptionName& name, std::size_t sent) {
+  const Bytes whole(frame);
+  const std::array<Bytes, 3> all = {whole.first(frame_name_offset),
+                                    Bytes(reinterpret_cast<const std::uint8_t*>(name.data()), name.size()),
+                                    whole.subspan(frame_name_offset + name.size())};
+  std::array<iovec, 3> rest{};
+  for (std::size_t i = 0; i < all.size(); ++i) {
+    const std::size_t skipped = std::min(sent, all[i].size());
+    sent -= skipped;
+    const Bytes left = all[i].subspan(skipped);
+    rest[i] = {const_cast<std::uint8_t*>(left.data()), left.size()};
+  }
+  return rest;
+}
+
+/* Bytes that the socket took, 0 when it takes none now; nothing when it is broken. */
+std::optional<std::size_t> send_pieces(int socket, const Frame& frame, const SubscriptionName& name, std::size_t sent) {
+  auto rest = pieces(frame, name, sent);
+  msghdr message{};
+  message.msg_iov = rest.data();
+  message.msg_iovlen = rest.size();
+  for (;;) {
+    const ssize_t taken = sendmsg(socket, &message, MSG_DONTWAIT | MSG_NOSIGNAL);
+    if (taken >= 0) {
+      return static_cast<std::size_t>(taken);
+    }
+    if (errno == EAGAIN || errno == EWOULDBLOCK) {
+      return 0;
+    }
+    if (errno != EINTR) {
+      return std::nullopt;
+    }
+  }
+}
+
+}  // namespace
+
+OutputQueue::Result OutputQueue::push(int socket, SharedFrame frame, const SubscriptionName& name, std::size_t bound) {
+  std::size_t sent = 0;
+  if (entries_.empty()) {
+    const auto taken = send_pieces(socket, *frame, name, 0);
+    if (!taken) {
+      return Result::Broken;
+    }
+    sent = *taken;
+  }
+  const std::size_t left = frame->size() - sent;
+  if (left == 0) {
+    return Result::Sent;
+  }
+  if (size_ + left > bound) {
+    return Result::Full;
+  }
+  size_ += left;
+  entries_.push_back({std::move(frame), name, sent});
+  return Result::Kept;
+}
+
+OutputQueue::Result OutputQueue::flush(int socket) {
+  while (!entries_.empty()) {
+    Entry& entry = entries_.front();
+    const auto taken = send_pieces(socket, *entry.frame, entry.name, entry.sent);
+    if (!taken) {
+      return Result::Broken;
+    }
+    if (*taken == 0) {
+      return Result::Kept;
+    }
+    entry.sent += *taken;
+    size_ -= *taken;
+    if (entry.sent == entry.frame->size()) {
+      entries_.pop_front();
+    }
+  }
+  return Result::Sent;
+}
+
+}  // namespace hbd
