@@ -1,0 +1,11 @@
+// Events as JSON.
+#pragma once
+
+#include "json.h"
+#include "watch_state.h"
+
+namespace hbctl {
+
+Json event_json(const Event& event, const WatchState& state);
+
+}  // namespace hbctl
