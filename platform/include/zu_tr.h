@@ -28,10 +28,15 @@ typedef void* tr_file_token;
  * @param categories what the component has to say of each category.
  * @param num_categories entries of the three arrays.
  * @param tokens one token a category, filled here and passed with every record.
- * @return 0, or -1 when an argument is null; the levels are then left alone.
+ * @return 0, or -1 when an argument is null or memory runs out; the levels are then left alone.
  */
 int tr_ms_register_component_1(const char* component, uint8_t* detail_levels, const tr_category* categories,
                                uint32_t num_categories, tr_file_token* tokens);
+
+/*
+ * Making a record changes no `errno`, is no cancellation point and may happen in several threads at once. A record
+ * whose token is null or belongs to a category that is off is dropped.
+ */
 
 /** A record without values. */
 void tr_ms_record_id_1(const char* component, uint32_t record_id, tr_file_token token);

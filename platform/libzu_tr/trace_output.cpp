@@ -73,7 +73,7 @@ spdlog::sink_ptr open_destination(const Trace_Place& place) {
 }  // namespace
 
 spdlog::sink_ptr open_trace_sink(const Trace_Place& place) {
-  const spdlog::sink_ptr sink = open_destination(place);
+  spdlog::sink_ptr sink = open_destination(place);
   if (sink) sink->set_formatter(std::make_unique<spdlog::pattern_formatter>(line_pattern));
   return sink;
 }

@@ -10,9 +10,6 @@
 #include <string>
 #include <vector>
 
-using testing::IsEmpty;
-using testing::SizeIs;
-
 namespace {
 
 // The names and numbers of lib/trace_records.h.

@@ -31,6 +31,7 @@ void set_trace(const char* place, const char* detail) {
 std::vector<std::string> without_times(const std::vector<std::string>& lines) {
   static const std::regex time(R"(^\d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\.\d{6}[+-]\d\d:\d\d )");
   std::vector<std::string> out;
+  out.reserve(lines.size());
   for (const std::string& line : lines) out.push_back(std::regex_replace(line, time, ""));
   return out;
 }

@@ -182,6 +182,7 @@ TEST(TraceRecord, OfSeveralThreadsStayWholeLines) {
     Trace_Component component;
     EXPECT_EQ(component.register_it(), 0);
     std::vector<std::thread> running;
+    running.reserve(threads);
     for (int each = 0; each < threads; ++each) {
       running.emplace_back([&component] {
         for (uint32_t at = 0; at < records; ++at) {
@@ -202,6 +203,7 @@ TEST(TraceRegistration, MayHappenInSeveralThreadsAtOnce) {
     set_trace("stderr", "errors");
     std::vector<Trace_Component> components(8);
     std::vector<std::thread> running;
+    running.reserve(components.size());
     for (Trace_Component& each : components) {
       running.emplace_back([&each] {
         EXPECT_EQ(each.register_it(), 0);
