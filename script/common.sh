@@ -15,15 +15,20 @@ die() {
 # Prints the comment at the head of the calling script, which is its help.
 usage() { sed -n '2,/^[^#]/{/^# shellcheck/d;/^#/s/^# \{0,1\}//p}' "$script"; }
 
-# Builds a preset: configure it, with a compiler cache when there is one, and build the targets named (all by default).
-build_preset() {
+# Configures a preset, with a compiler cache when there is one. More arguments are handed to cmake.
+configure_build() {
   local preset=$1 launcher=()
   shift
   if command -v ccache >/dev/null; then
     launcher=(-DCMAKE_C_COMPILER_LAUNCHER=ccache -DCMAKE_CXX_COMPILER_LAUNCHER=ccache)
   fi
-  cmake --preset "$preset" "${launcher[@]}" >/dev/null
-  cmake --build --preset "$preset" ${1:+--target "$@"}
+  cmake --preset "$preset" "${launcher[@]}" "$@" >/dev/null
+}
+
+# Configures and builds a preset.
+build_preset() {
+  configure_build "$1"
+  cmake --build --preset "$1"
 }
 
 # The project's sources of the kinds named, for instance: sources cpp h
