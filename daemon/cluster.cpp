@@ -79,11 +79,11 @@ void Cluster::change(const ConfigurationChange& update, Delta& delta) {
   delta.reconfigured = true;
 }
 
-void Cluster::change(const FailureData& data, Delta& delta) { delta.notices.push_back({0, data}); }
+void Cluster::change(const FailureData& data, Delta& delta) { delta.notices.emplace_back().body = data; }
 
-void Cluster::change(const DifferentInstance& sender, Delta& delta) { delta.notices.push_back({0, sender}); }
+void Cluster::change(const DifferentInstance& sender, Delta& delta) { delta.notices.emplace_back().body = sender; }
 
-void Cluster::change(const HeartbeatSettings& settings, Delta& delta) { delta.notices.push_back({0, settings}); }
+void Cluster::change(const HeartbeatSettings& settings, Delta& delta) { delta.notices.emplace_back().body = settings; }
 
 void Cluster::set_working(const std::vector<Hb_Adapter_Number>& adapters, bool working, Delta& delta) {
   for (const auto number : adapters) {
@@ -200,7 +200,11 @@ MemberSet set_of(const Numbers& numbers, std::size_t limit, NumberOf number_of) 
 
 std::vector<Event> Cluster::events_of(Delta& delta) {
   std::vector<Event> events;
-  const auto tell = [&](auto body) { events.push_back({++sequence_, std::move(body)}); };
+  const auto tell = [&](auto body) {
+    Event& event = events.emplace_back();
+    event.sequence = ++sequence_;
+    event.body = std::move(body);
+  };
   const bool new_adapter_group = !delta.died.empty() || !delta.joined.empty();
   const bool new_node_group = !delta.died_nodes.empty() || !delta.joined_nodes.empty();
   adapter_group_ += new_adapter_group ? 1 : 0;
@@ -231,7 +235,7 @@ std::vector<Event> Cluster::events_of(Delta& delta) {
     tell(NodeGroupEvent{left_nodes});
   }
   for (auto& notice : delta.notices) {
-    events.push_back({++sequence_, std::move(notice.body)});
+    tell(std::move(notice.body));
   }
   return events;
 }
