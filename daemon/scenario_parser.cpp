@@ -258,7 +258,7 @@ ChurnKind ScenarioReader::read_kind(const std::string& name, unsigned line) cons
 }
 
 Change ScenarioReader::read_change(TomlTable& event) {
-  const ChurnKind wanted = read_kind(event.text("kind", 64), event.line());
+  const ChurnKind wanted = read_kind(event.text("kind", 64), event.line("kind"));
   const auto found = std::find_if(kinds.begin(), kinds.end(), [&](const Kind& each) { return each.kind == wanted; });
   return (this->*found->read)(event);
 }

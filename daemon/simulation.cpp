@@ -20,7 +20,7 @@ Simulation::Simulation(Loop& loop, Scenario scenario, Pace pace)
       scenario_(std::move(scenario)),
       pace_(pace),
       timeline_(scenario_),
-      timer_(loop, [this] { pace_.as_fast_as_read ? on_audience() : play_what_is_due(); }),
+      timer_(loop, [this] { pace_.as_fast_as_read ? play_what_can_be_read() : play_what_is_due(); }),
       idle_(loop, [this] { play_what_can_be_read(); }) {}
 
 void Simulation::set_audience(Audience& audience) {

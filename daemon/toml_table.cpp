@@ -25,9 +25,13 @@ const toml::node& TomlTable::get(std::string_view key) {
   return *node;
 }
 
-void TomlTable::refuse(std::string_view key, const std::string& complaint) const {
+unsigned TomlTable::line(std::string_view key) const {
   const toml::node* node = table_->get(key);
-  throw ScenarioMistake{node == nullptr ? line() : line_of(*node), fmt::format("{} \"{}\" {}", title_, key, complaint)};
+  return node == nullptr ? line() : line_of(*node);
+}
+
+void TomlTable::refuse(std::string_view key, const std::string& complaint) const {
+  throw ScenarioMistake{line(key), fmt::format("{} \"{}\" {}", title_, key, complaint)};
 }
 
 std::string TomlTable::text(std::string_view key, std::size_t longest) {

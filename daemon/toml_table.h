@@ -31,7 +31,10 @@ class TomlTable {
   TomlTable(const toml::table& table, std::string title) : table_(&table), title_(std::move(title)) {}
 
   [[nodiscard]] bool has(std::string_view key) const { return table_->contains(key); }
+  /** Line of the table. */
   [[nodiscard]] unsigned line() const { return line_of(*table_); }
+  /** Line of a key's value, or of the table when the key is not there. */
+  [[nodiscard]] unsigned line(std::string_view key) const;
   [[nodiscard]] const std::string& title() const { return title_; }
 
   /** A text of one to `longest` characters. */

@@ -1,0 +1,149 @@
+/* The membership model: what each change means. */
+#include "cluster.h"
+
+#include <gmock/gmock.h>
+
+#include "hb_client/group.h"
+
+namespace {
+
+using hbd::Adapter;
+using hbd::AdapterEvent;
+using hbd::Cluster;
+using hbd::Event;
+using hbd::NodeEvent;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+/* Three nodes on two networks, an adapter on each; the second adapter of node 2 is missing. */
+hbd::Configuration three_nodes() {
+  hbd::Configuration configuration;
+  configuration.max_nodes = 4;
+  configuration.adapters_per_node = 2;
+  configuration.networks = {{"public", ""}, {"storage", ""}};
+  for (const Hb_Adapter_Number number : {0U, 1U, 2U, 3U, 4U}) {
+    configuration.adapters[number] = {number, {}, static_cast<Hb_Network_Number>(number % 2), "", true};
+  }
+  return configuration;
+}
+
+std::vector<std::size_t> members(const hbd::MemberSet& set) {
+  std::vector<std::size_t> numbers;
+  set.for_each([&](std::size_t number) { numbers.push_back(number); });
+  return numbers;
+}
+
+std::vector<std::size_t> kinds(const std::vector<Event>& events) {
+  std::vector<std::size_t> indexes;
+  for (const auto& event : events) {
+    indexes.push_back(event.body.index());
+  }
+  return indexes;
+}
+
+constexpr std::size_t adapter_event = 0;
+constexpr std::size_t node_event = 1;
+constexpr std::size_t adapter_group = 2;
+constexpr std::size_t node_group = 3;
+constexpr std::size_t configuration_event = 4;
+
+TEST(Cluster, starts_with_everything_up_that_works) {
+  auto configuration = three_nodes();
+  configuration.adapters[4].up = false;
+  const Cluster cluster(configuration);
+  EXPECT_THAT(members(cluster.up_adapters()), ElementsAre(0, 1, 2, 3));
+  EXPECT_THAT(members(cluster.up_nodes()), ElementsAre(0, 1));
+  EXPECT_EQ(cluster.sequence(), 1U);
+  EXPECT_EQ(cluster.configuration_sequence(), 1U);
+}
+
+TEST(Cluster, keeps_a_node_up_until_its_last_adapter_dies) {
+  Cluster cluster(three_nodes());
+  EXPECT_THAT(kinds(cluster.apply(hbd::AdapterDeath{{2}})), ElementsAre(adapter_event, adapter_group));
+  EXPECT_THAT(kinds(cluster.apply(hbd::AdapterDeath{{3}})),
+              ElementsAre(adapter_event, node_event, adapter_group, node_group));
+  EXPECT_THAT(members(cluster.up_nodes()), ElementsAre(0, 2));
+}
+
+TEST(Cluster, does_not_revive_a_broken_adapter_with_its_node) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::AdapterDeath{{2}});
+  cluster.apply(hbd::NodeDeath{1, {}});
+  cluster.apply(hbd::NodeJoin{1, {}});
+  EXPECT_THAT(members(cluster.up_adapters()), ElementsAre(0, 1, 3, 4));
+}
+
+TEST(Cluster, does_not_revive_an_adapter_on_a_lost_network_with_its_node) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::NetworkLoss{0});
+  cluster.apply(hbd::NodeDeath{1, {}});
+  cluster.apply(hbd::NodeJoin{1, {}});
+  EXPECT_THAT(members(cluster.up_adapters()), ElementsAre(1, 3));
+  cluster.apply(hbd::NetworkReturn{0});
+  EXPECT_THAT(members(cluster.up_adapters()), ElementsAre(0, 1, 2, 3, 4));
+}
+
+TEST(Cluster, repairs_an_adapter_of_a_stopped_node_without_an_event_and_brings_it_up_with_the_node) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::AdapterDeath{{2}});
+  cluster.apply(hbd::NodeDeath{1, {}});
+  EXPECT_THAT(cluster.apply(hbd::AdapterJoin{{2}}), IsEmpty());
+  cluster.apply(hbd::NodeJoin{1, {}});
+  EXPECT_THAT(members(cluster.up_adapters()), ElementsAre(0, 1, 2, 3, 4));
+}
+
+TEST(Cluster, counts_events_and_group_incarnations) {
+  Cluster cluster(three_nodes());
+  const auto events = cluster.apply(hbd::NodeDeath{1, {}});
+  ASSERT_EQ(events.size(), 4U);
+  EXPECT_EQ(events.front().sequence, 2U);
+  EXPECT_EQ(events.back().sequence, 5U);
+  EXPECT_EQ(cluster.adapter_group_incarnation(), 2U);
+  EXPECT_EQ(cluster.node_group_incarnation(), 2U);
+  cluster.apply(hbd::AdapterDeath{{0}});
+  EXPECT_EQ(cluster.adapter_group_incarnation(), 3U);
+  EXPECT_EQ(cluster.node_group_incarnation(), 2U);
+}
+
+TEST(Cluster, tells_nothing_of_a_change_without_effect) {
+  Cluster cluster(three_nodes());
+  EXPECT_THAT(cluster.apply(hbd::AdapterJoin{{0}}), IsEmpty());
+  EXPECT_THAT(cluster.apply(hbd::NodeJoin{0, {}}), IsEmpty());
+  EXPECT_THAT(cluster.apply(hbd::NetworkReturn{1}), IsEmpty());
+  EXPECT_THAT(cluster.apply(hbd::AdapterDeath{{7}}), IsEmpty());
+  EXPECT_EQ(cluster.sequence(), 1U);
+}
+
+TEST(Cluster, replaces_an_adapter_in_its_slot_as_a_removal_and_a_join) {
+  Cluster cluster(three_nodes());
+  const auto events = cluster.apply(hbd::ConfigurationChange{{4}, {}, {Adapter{4, {}, 1, "new", true}}});
+  ASSERT_THAT(kinds(events), ElementsAre(adapter_event, configuration_event, adapter_event, adapter_group));
+  EXPECT_EQ(std::get<AdapterEvent>(events[0].body).adapters.at(0).incarnation, 1U | HB_DIED_BECAUSE_REMOVED_BIT);
+  EXPECT_EQ(std::get<AdapterEvent>(events[2].body).adapters.at(0).incarnation, 2U);
+  EXPECT_EQ(cluster.configuration().adapters.at(4).type, "new");
+  EXPECT_EQ(cluster.configuration_sequence(), 2U);
+}
+
+TEST(Cluster, removes_an_adapter_that_is_down_without_a_death) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::AdapterDeath{{3}});
+  EXPECT_THAT(kinds(cluster.apply(hbd::ConfigurationChange{{3}, {}, {}})), ElementsAre(configuration_event));
+}
+
+TEST(Cluster, starts_a_node_that_is_configured_anew_although_it_had_stopped) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::NodeDeath{2, {}});
+  cluster.apply(hbd::ConfigurationChange{{4}, {}, {}});
+  const auto events = cluster.apply(hbd::ConfigurationChange{{}, {}, {Adapter{4, {}, 0, "", true}}});
+  EXPECT_THAT(kinds(events), ElementsAre(configuration_event, adapter_event, node_event, adapter_group, node_group));
+}
+
+TEST(Cluster, takes_new_networks_before_new_adapters) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::ConfigurationChange{{}, {{"third", ""}}, {Adapter{5, {}, 2, "", true}}});
+  EXPECT_EQ(cluster.configuration().networks.size(), 3U);
+  EXPECT_TRUE(cluster.up_adapters().contains(5));
+  EXPECT_TRUE(cluster.network_is_available(2));
+}
+
+}  // namespace
