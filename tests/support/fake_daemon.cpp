@@ -1,6 +1,7 @@
 #include "support/fake_daemon.h"
 
 #include <poll.h>
+#include <sys/eventfd.h>
 #include <sys/ipc.h>
 #include <sys/sem.h>
 #include <sys/shm.h>
@@ -8,13 +9,16 @@
 #include <sys/un.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <initializer_list>
 #include <stdexcept>
 #include <system_error>
 #include <utility>
+#include <vector>
 
 namespace hb_test {
 
@@ -26,28 +30,60 @@ constexpr int patience_ms = 10000;
   throw std::system_error(errno, std::generic_category(), what);
 }
 
-bool readable_within(int descriptor, int milliseconds) {
-  pollfd request{descriptor, POLLIN, 0};
+// Whether the first of the descriptors became readable.
+bool readable_within(std::initializer_list<int> descriptors, int milliseconds) {
+  std::vector<pollfd> requests;
+  for (const int descriptor : descriptors) {
+    requests.push_back({descriptor, POLLIN, 0});
+  }
   int ready = 0;
   do {
-    ready = ::poll(&request, 1, milliseconds);
+    ready = ::poll(requests.data(), requests.size(), milliseconds);
   } while (ready < 0 && errno == EINTR);
-  return ready > 0;
+  return ready > 0 && requests[0].revents != 0;
 }
 
-void await_readable(int descriptor, const char* what) {
-  if (!readable_within(descriptor, patience_ms)) {
-    throw std::runtime_error(std::string("nothing came within ten seconds: ") + what);
+void await_readable(int descriptor, const StopSignal& stop, const char* what) {
+  if (!readable_within({descriptor, stop.descriptor()}, patience_ms)) {
+    throw std::runtime_error(std::string("waited in vain for ") + what);
   }
 }
 
+}  // namespace
+
+StopSignal::StopSignal() : descriptor_(::eventfd(0, EFD_CLOEXEC)) {
+  if (descriptor_ < 0) {
+    throw_errno("eventfd");
+  }
+}
+
+StopSignal::~StopSignal() { ::close(descriptor_); }
+
+void StopSignal::raise() {
+  if (::eventfd_write(descriptor_, 1) != 0) {
+    throw_errno("eventfd_write");
+  }
+}
+
+DaemonConnection::DaemonConnection(DaemonConnection&& other) noexcept
+    : descriptor_(std::exchange(other.descriptor_, -1)), stop_(std::move(other.stop_)) {}
+
+DaemonConnection& DaemonConnection::operator=(DaemonConnection&& other) noexcept {
+  if (this != &other) {
+    close();
+    descriptor_ = std::exchange(other.descriptor_, -1);
+    stop_ = std::move(other.stop_);
+  }
+  return *this;
+}
+
 // Bytes of the stream, fewer than asked only at its end.
-Bytes receive_up_to(int descriptor, size_t count) {
+Bytes DaemonConnection::receive_up_to(size_t count) {
   Bytes bytes;
   while (bytes.size() < count) {
-    await_readable(descriptor, "bytes of a client");
+    await_readable(descriptor_, *stop_, "bytes of a client");
     char buffer[65536];
-    const ssize_t n = ::recv(descriptor, buffer, std::min(count - bytes.size(), sizeof buffer), 0);
+    const ssize_t n = ::recv(descriptor_, buffer, std::min(count - bytes.size(), sizeof buffer), 0);
     if (n < 0 && errno == EINTR) {
       continue;
     }
@@ -62,21 +98,8 @@ Bytes receive_up_to(int descriptor, size_t count) {
   return bytes;
 }
 
-}  // namespace
-
-DaemonConnection::DaemonConnection(DaemonConnection&& other) noexcept
-    : descriptor_(std::exchange(other.descriptor_, -1)) {}
-
-DaemonConnection& DaemonConnection::operator=(DaemonConnection&& other) noexcept {
-  if (this != &other) {
-    close();
-    descriptor_ = std::exchange(other.descriptor_, -1);
-  }
-  return *this;
-}
-
 Bytes DaemonConnection::receive_raw(size_t count) {
-  Bytes bytes = receive_up_to(descriptor_, count);
+  Bytes bytes = receive_up_to(count);
   if (bytes.size() < count) {
     throw std::runtime_error("the client closed the connection");
   }
@@ -85,9 +108,9 @@ Bytes DaemonConnection::receive_raw(size_t count) {
 
 Bytes DaemonConnection::receive_request() { return receive_raw(u32_at(receive_raw(4), 0)); }
 
-bool DaemonConnection::has_input() const { return readable_within(descriptor_, 0); }
+bool DaemonConnection::has_input() const { return readable_within({descriptor_}, 0); }
 
-bool DaemonConnection::at_end() { return receive_up_to(descriptor_, 1).empty(); }
+bool DaemonConnection::at_end() { return receive_up_to(1).empty(); }
 
 void DaemonConnection::send_raw(std::string_view bytes) {
   while (!bytes.empty()) {
@@ -138,7 +161,7 @@ FakeDaemon::FakeDaemon(const Publication& publication) : publication_(publicatio
 }
 
 FakeDaemon::~FakeDaemon() {
-  ::shutdown(listener_, SHUT_RDWR);  // wakes a script that still waits for a client
+  stop_->raise();  // a script may still wait for a client or for bytes
   if (thread_.joinable()) {
     thread_.join();
   }
@@ -230,15 +253,15 @@ void FakeDaemon::withdraw() {
 }
 
 DaemonConnection FakeDaemon::accept() {
-  await_readable(listener_, "a client");
+  await_readable(listener_, *stop_, "a client");
   const int descriptor = ::accept4(listener_, nullptr, nullptr, SOCK_CLOEXEC);
   if (descriptor < 0) {
     throw_errno("accept");
   }
-  return DaemonConnection(descriptor);
+  return DaemonConnection(descriptor, stop_);
 }
 
-bool FakeDaemon::has_client() const { return readable_within(listener_, 0); }
+bool FakeDaemon::has_client() const { return readable_within({listener_}, 0); }
 
 void FakeDaemon::run(std::function<void(FakeDaemon&)> script) {
   join();

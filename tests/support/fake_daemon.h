@@ -7,19 +7,39 @@
 #include <cstdint>
 #include <exception>
 #include <functional>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <thread>
+#include <utility>
 
 #include "support/bytes.h"
 
 namespace hb_test {
 
-// One connection of a client, as the daemon sees it. Waits at most ten seconds for bytes, then throws.
+// Ends all waiting of a daemon and of its connections.
+class StopSignal {
+ public:
+  StopSignal();
+  ~StopSignal();
+  StopSignal(const StopSignal&) = delete;
+  StopSignal& operator=(const StopSignal&) = delete;
+
+  void raise();
+  // Readable from then on.
+  int descriptor() const { return descriptor_; }
+
+ private:
+  int descriptor_;
+};
+
+// One connection of a client, as the daemon sees it. Waits at most ten seconds for bytes, or until the daemon is
+// destroyed, then throws.
 class DaemonConnection {
  public:
   DaemonConnection() = default;
-  explicit DaemonConnection(int descriptor) : descriptor_(descriptor) {}
+  DaemonConnection(int descriptor, std::shared_ptr<const StopSignal> stop)
+      : descriptor_(descriptor), stop_(std::move(stop)) {}
   ~DaemonConnection() { close(); }
   DaemonConnection(DaemonConnection&& other) noexcept;
   DaemonConnection& operator=(DaemonConnection&& other) noexcept;
@@ -44,7 +64,10 @@ class DaemonConnection {
   void close();
 
  private:
+  Bytes receive_up_to(size_t count);
+
   int descriptor_ = -1;
+  std::shared_ptr<const StopSignal> stop_;
 };
 
 // What the daemon publishes. Whatever is left out does not exist.
@@ -119,6 +142,7 @@ class FakeDaemon {
   Publication publication_;
   std::string directory_;
   std::string path_;
+  std::shared_ptr<StopSignal> stop_ = std::make_shared<StopSignal>();
   int listener_ = -1;
   int segment_ids_[3] = {-1, -1, -1};
   int semaphore_id_ = -1;
