@@ -25,10 +25,12 @@ configure_build() {
   cmake --preset "$preset" "${launcher[@]}" "$@" >/dev/null
 }
 
-# Configures and builds a preset.
+# Configures and builds a preset. More arguments are handed to the build.
 build_preset() {
-  configure_build "$1"
-  cmake --build --preset "$1"
+  local preset=$1
+  shift
+  configure_build "$preset"
+  cmake --build --preset "$preset" "$@"
 }
 
 # The project's sources of the kinds named, for instance: sources cpp h
