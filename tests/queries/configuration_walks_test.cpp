@@ -1,0 +1,250 @@
+// Walking what is configured, and the bound of network numbers.
+#include <gmock/gmock.h>
+
+#include <cstring>
+#include <functional>
+#include <ostream>
+
+#include "configuration_queries.h"
+
+namespace hb_test {
+namespace {
+
+// One first/next pair, with what it is to yield in the sparse cluster.
+struct Walk {
+  const char* name;
+  std::function<Hb_Rc(int64_t*, Hb_Cursor*)> first;
+  std::function<Hb_Rc(int64_t*, Hb_Cursor*)> next;
+  std::vector<int64_t> items;
+  std::vector<Hb_Cursor> cursors;  // after each item
+  int64_t none;
+};
+
+void PrintTo(const Walk& walk, std::ostream* stream) { *stream << walk.name; }
+
+// The pair with its output widened, so that all walks look alike.
+template <typename Number, typename Call>
+std::function<Hb_Rc(int64_t*, Hb_Cursor*)> widened(Call call) {
+  return [call](int64_t* item, Hb_Cursor* cursor) {
+    auto number = static_cast<Number>(*item);
+    const Hb_Rc result = call(&number, cursor);
+    *item = number;
+    return result;
+  };
+}
+
+template <typename Number, typename First, typename Next>
+Walk walk(const char* name, First first, Next next, std::vector<int64_t> items, std::vector<Hb_Cursor> cursors,
+          int64_t none) {
+  return {name, widened<Number>(first), widened<Number>(next), std::move(items), std::move(cursors), none};
+}
+
+std::vector<Walk> walks() {
+  return {
+      walk<Hb_Node_Number>("Nodes", hb_get_first_configured_node_number, hb_get_next_configured_node_number, {0, 3, 4},
+                           {1, 4, 5}, -1),
+      walk<Hb_Adapter_Number>("Adapters", hb_get_first_configured_adapter_number, hb_get_next_configured_adapter_number,
+                              {13, 0, 12, 17, 2}, {1, 2, 3, 4, 5}, 0xFFFFFFFF),
+      walk<Hb_Adapter_Number>(
+          "AdaptersOfANode",
+          [](auto* item, auto* cursor) { return hb_get_first_configured_adapter_in_node(0, item, cursor); },
+          [](auto* item, auto* cursor) { return hb_get_next_configured_adapter_in_node(0, item, cursor); }, {0, 2},
+          {1, 3}, 0xFFFFFFFF),
+      walk<Hb_Adapter_Number>(
+          "AdaptersOfAnotherNode",
+          [](auto* item, auto* cursor) { return hb_get_first_configured_adapter_in_node(3, item, cursor); },
+          [](auto* item, auto* cursor) { return hb_get_next_configured_adapter_in_node(3, item, cursor); }, {12, 13},
+          {1, 2}, 0xFFFFFFFF),
+      walk<Hb_Network_Number>("Networks", hb_get_first_configured_network_number, hb_get_next_configured_network_number,
+                              {0, 1, 3}, {1, 2, 4}, -1),
+      walk<Hb_Adapter_Number>(
+          "AdaptersOfANetwork",
+          [](auto* item, auto* cursor) { return hb_get_first_configured_adapter_in_network(1, item, cursor); },
+          [](auto* item, auto* cursor) { return hb_get_next_configured_adapter_in_network(1, item, cursor); }, {13, 17},
+          {1, 4}, 0xFFFFFFFF),
+      walk<Hb_Site_Number>("Sites", hb_get_first_configured_site_number, hb_get_next_configured_site_number, {1}, {2},
+                           65535),
+  };
+}
+
+class Walks : public ConfigurationQueries, public testing::WithParamInterface<Walk> {
+ protected:
+  Walks() {
+    global_config_tbl.Hb_max_sites = 2;
+    global_site_tbl[1] = Hb_True;
+  }
+
+  const Walk& walk_ = GetParam();
+};
+
+TEST_P(Walks, YieldTheirItemsInOrderAndMoveTheCursorBehindEach) {
+  int64_t item = 77;
+  Hb_Cursor cursor = 1000;
+  for (size_t index = 0; index < walk_.items.size(); ++index) {
+    EXPECT_TRUE(succeeds([&] { return index == 0 ? walk_.first(&item, &cursor) : walk_.next(&item, &cursor); }));
+    EXPECT_EQ(walk_.items[index], item);
+    EXPECT_EQ(walk_.cursors[index], cursor);
+  }
+}
+
+TEST_P(Walks, KeepFailingAtTheEndWithNoneAndLeaveTheCursor) {
+  Hb_Cursor cursor = walk_.cursors.back();
+  for (int call = 0; call < 3; ++call) {
+    int64_t item = 77;
+    EXPECT_TRUE(fails_with(1, [&] { return walk_.next(&item, &cursor); }));
+    EXPECT_EQ(walk_.none, item);
+    EXPECT_EQ(walk_.cursors.back(), cursor);
+  }
+}
+
+TEST_P(Walks, StartAgainWithAFirstCall) {
+  int64_t item = 77;
+  Hb_Cursor cursor = walk_.cursors.back();
+  EXPECT_TRUE(succeeds([&] { return walk_.first(&item, &cursor); }));
+  EXPECT_EQ(walk_.items.front(), item);
+  EXPECT_EQ(walk_.cursors.front(), cursor);
+}
+
+TEST_P(Walks, TakeACursorOutsideTheListAsItsEnd) {
+  for (const Hb_Cursor outside : {-1, -2147483647 - 1, 98352, 2147483647}) {
+    Hb_Cursor cursor = outside;
+    int64_t item = 77;
+    EXPECT_TRUE(fails_with(1, [&] { return walk_.next(&item, &cursor); })) << outside;
+    EXPECT_EQ(walk_.none, item) << outside;
+    EXPECT_EQ(outside, cursor);
+  }
+}
+
+TEST_P(Walks, RefuseANullCursor) {
+  int64_t item = 77;
+  EXPECT_TRUE(fails_with(4, [&] { return walk_.first(&item, nullptr); }));
+  EXPECT_TRUE(fails_with(4, [&] { return walk_.next(&item, nullptr); }));
+}
+
+INSTANTIATE_TEST_SUITE_P(ConfigurationQueries, Walks, testing::ValuesIn(walks()),
+                         [](const auto& test) { return std::string(test.param.name); });
+
+TEST_F(ConfigurationQueries, TheAdaptersOfANodeOutOfRangeOrWithoutAnyAreNotWalked) {
+  Hb_Adapter_Number adapter = 99;
+  Hb_Cursor cursor = 55;
+  for (const int number : {-1, 8}) {
+    const auto node = static_cast<Hb_Node_Number>(number);
+    EXPECT_TRUE(fails_with(4, [&] { return hb_get_first_configured_adapter_in_node(node, &adapter, &cursor); }));
+    EXPECT_TRUE(fails_with(4, [&] { return hb_get_next_configured_adapter_in_node(node, &adapter, &cursor); }));
+  }
+  EXPECT_TRUE(fails_with(9, [&] { return hb_get_first_configured_adapter_in_node(1, &adapter, &cursor); }));
+  EXPECT_TRUE(fails_with(9, [&] { return hb_get_next_configured_adapter_in_node(1, &adapter, &cursor); }));
+  EXPECT_EQ(99U, adapter);
+  EXPECT_EQ(55, cursor);
+}
+
+TEST_F(ConfigurationQueries, TheAdaptersOfANetworkOutOfRangeOrUnusedAreNotWalked) {
+  Hb_Adapter_Number adapter = 99;
+  Hb_Cursor cursor = 55;
+  for (const int number : {-1, 4}) {
+    const auto network = static_cast<Hb_Network_Number>(number);
+    EXPECT_TRUE(fails_with(4, [&] { return hb_get_first_configured_adapter_in_network(network, &adapter, &cursor); }));
+    EXPECT_TRUE(fails_with(4, [&] { return hb_get_next_configured_adapter_in_network(network, &adapter, &cursor); }));
+  }
+  EXPECT_TRUE(fails_with(8, [&] { return hb_get_first_configured_adapter_in_network(2, &adapter, &cursor); }));
+  EXPECT_TRUE(fails_with(8, [&] { return hb_get_next_configured_adapter_in_network(2, &adapter, &cursor); }));
+  EXPECT_EQ(99U, adapter);
+  EXPECT_EQ(55, cursor);
+}
+
+TEST_F(ConfigurationQueries, ANetworkInUseWithoutAdaptersEndsAtOnce) {
+  std::strcpy(global_config_tbl.Hb_global_network_list[2].Hb_network_name, "net_idle");
+  Hb_Adapter_Number adapter = 99;
+  Hb_Cursor cursor = 55;
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_first_configured_adapter_in_network(2, &adapter, &cursor); }));
+  EXPECT_EQ(0xFFFFFFFFU, adapter);
+  EXPECT_EQ(55, cursor);
+}
+
+TEST_F(ConfigurationQueries, WithoutSitesTheFirstSiteFailsAtOnce) {
+  Hb_Site_Number site = 99;
+  Hb_Cursor cursor = 55;
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_first_configured_site_number(&site, &cursor); }));
+  EXPECT_EQ(65535, site);
+  EXPECT_EQ(55, cursor);
+}
+
+TEST_F(ConfigurationQueries, NodesAtTheMaximumAreNotWalked) {
+  global_node_tbl[8] = Hb_True;
+  Hb_Node_Number node = 99;
+  Hb_Cursor cursor = 5;
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_configured_node_number(&node, &cursor); }));
+}
+
+TEST_F(ConfigurationQueries, OfNodes0And3Of8OnlyTheseAreWalked) {
+  reload(ConfigurationMessage().max_nodes(8).adapters_per_node(2).adapter(0, "10.0.0.1").adapter(7, "10.0.0.2"));
+  Hb_Node_Number node = 99;
+  Hb_Cursor cursor = 0;
+  EXPECT_EQ(Hb_Success, hb_get_first_configured_node_number(&node, &cursor));
+  EXPECT_EQ(0, node);
+  EXPECT_EQ(Hb_Success, hb_get_next_configured_node_number(&node, &cursor));
+  EXPECT_EQ(3, node);
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_configured_node_number(&node, &cursor); }));
+  EXPECT_EQ(-1, node);
+}
+
+// Two nodes of 60 slots; all 48 networks that a configuration can hold.
+ConfigurationMessage wide_nodes() {
+  ConfigurationMessage configuration;
+  configuration.max_nodes(2).adapters_per_node(60).adapter(59, "10.0.0.1", 50).adapter(60, "10.0.0.2", 47);
+  for (int network = 0; network < 48; ++network) configuration.network("net" + std::to_string(network));
+  return configuration;
+}
+
+TEST_F(ConfigurationQueries, NetworksBeyondThe48SlotsAreUnusedOnes) {
+  reload(wide_nodes());
+  for (const int number : {48, 59}) {
+    const auto network = static_cast<Hb_Network_Number>(number);
+    char text[70] = "before";
+    Hb_Adapter_Number adapter = 99;
+    Hb_Cursor cursor = 55;
+    EXPECT_TRUE(fails_with(8, [&] { return hb_get_network_name_by_number(network, text); })) << number;
+    EXPECT_STREQ("before", text);
+    EXPECT_TRUE(fails_with(8, [&] { return hb_get_first_configured_adapter_in_network(network, &adapter, &cursor); }));
+    EXPECT_TRUE(succeeds([&] { return hb_get_network_type_by_number(network, text); })) << number;
+    EXPECT_STREQ("", text);
+  }
+  char text[70];
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_network_name_by_number(60, text); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_network_type_by_number(60, text); }));
+}
+
+TEST_F(ConfigurationQueries, AllSlotsAreWalkedAndSearchedWhenNodesHaveMoreAdaptersThanSlots) {
+  reload(wide_nodes());
+  Hb_Network_Number network = 99;
+  Hb_Cursor cursor = 47;
+  EXPECT_TRUE(succeeds([&] { return hb_get_next_configured_network_number(&network, &cursor); }));
+  EXPECT_EQ(47, network);
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_configured_network_number(&network, &cursor); }));
+  EXPECT_EQ(-1, network);
+  char last[] = "net47";
+  EXPECT_TRUE(succeeds([&] { return hb_get_network_number_by_name(last, &network); }));
+  EXPECT_EQ(47, network);
+  char unknown[] = "net48";
+  EXPECT_TRUE(fails_with(8, [&] { return hb_get_network_number_by_name(unknown, &network); }));
+}
+
+TEST_F(ConfigurationQueries, ASlotOfANodeBeyond48IsAnAdapterLikeAnyOther) {
+  reload(wide_nodes());
+  Hb_Adapter_Number adapter = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_adapter_number_by_node_number(0, 59, &adapter); }));
+  EXPECT_EQ(59U, adapter);
+  Hb_Node_Number node = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_node_number_by_adapter_number(60, &node); }));
+  EXPECT_EQ(1, node);
+}
+
+TEST_F(ConfigurationQueries, FewerNetworksThanAdaptersPerNodeLeaveUnusedSlots) {
+  reload(ConfigurationMessage().max_nodes(1).adapters_per_node(5).adapter(0, "10.0.0.1").network("only"));
+  char text[70] = "before";
+  EXPECT_TRUE(fails_with(8, [&] { return hb_get_network_name_by_number(4, text); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_network_name_by_number(5, text); }));
+}
+
+}  // namespace
+}  // namespace hb_test
