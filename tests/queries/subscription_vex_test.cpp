@@ -1,0 +1,224 @@
+// Registering and withdrawing subscriptions in VEX mode.
+#include <gmock/gmock.h>
+
+#include <cerrno>
+#include <csignal>
+
+#include "vex_subscription.h"
+
+namespace hb_test {
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+TEST_F(VexSubscription, NodeTypesKeepTheNameAndWriteTheByteOne) {
+  make_pipe_handler();
+  for (const int32_t type : {0, 1}) {
+    set_name(nodeEventSubscriptionName, "");
+    EXPECT_EQ(Hb_Success, subscribe(type)) << type;
+    EXPECT_THAT(names(), ElementsAre("follower", "", "", ""));
+    EXPECT_THAT(bytes_written(), ElementsAre(1));
+  }
+}
+
+TEST_F(VexSubscription, AdapterAndNetworkTypesKeepTheNameAndWriteTheByteTwo) {
+  make_pipe_handler();
+  for (const int32_t type : {2, 3, 5}) {
+    set_name(networkEventSubscriptionName, "");
+    EXPECT_EQ(Hb_Success, subscribe(type)) << type;
+    EXPECT_THAT(names(), ElementsAre("", "follower", "", ""));
+    EXPECT_THAT(bytes_written(), ElementsAre(2));
+  }
+}
+
+TEST_F(VexSubscription, SiteTypesKeepTheNameAndWriteNothing) {
+  make_pipe_handler();
+  for (const int32_t type : {7, 8}) {
+    set_name(siteEventSubscriptionName, "");
+    EXPECT_EQ(Hb_Success, subscribe(type)) << type;
+    EXPECT_THAT(names(), ElementsAre("", "", "follower", ""));
+    EXPECT_THAT(bytes_written(), IsEmpty());
+  }
+}
+
+TEST_F(VexSubscription, TheSplitMergeTypeKeepsTheNameAndWritesNothing) {
+  make_pipe_handler();
+  EXPECT_EQ(Hb_Success, subscribe(9));
+  EXPECT_THAT(names(), ElementsAre("", "", "", "follower"));
+  EXPECT_THAT(bytes_written(), IsEmpty());
+}
+
+TEST_F(VexSubscription, TheDifferentInstanceTypeKeepsNoNameAndSucceeds) {
+  EXPECT_EQ(Hb_Success, subscribe(6));
+  EXPECT_THAT(names(), ElementsAre("", "", "", ""));
+}
+
+TEST_F(VexSubscription, SiteAndSplitMergeTypesNeedNoNewGroupHandler) {
+  EXPECT_EQ(Hb_Success, subscribe(7));
+  EXPECT_EQ(Hb_Success, subscribe(8));
+  EXPECT_EQ(Hb_Success, subscribe(9));
+}
+
+TEST_F(VexSubscription, TheEventMasksChooseTheNameThatIsKept) {
+  EXPECT_EQ(Hb_Success, subscribe(4, 96));
+  EXPECT_THAT(names(), ElementsAre("", "", "follower", ""));
+  EXPECT_EQ(Hb_Success, subscribe(4, 12288));
+  EXPECT_THAT(names(), ElementsAre("", "", "follower", "follower"));
+}
+
+TEST_F(VexSubscription, WithoutANewGroupHandlerTheNodeNameIsKeptAndTheCallFails) {
+  EXPECT_TRUE(fails_with(89, [&] { return subscribe(0); }));
+  EXPECT_THAT(names(), ElementsAre("follower", "", "", ""));
+}
+
+TEST_F(VexSubscription, WithoutANewGroupHandlerTheNetworkNameIsKeptAndTheCallFails) {
+  EXPECT_TRUE(fails_with(89, [&] { return subscribe(5); }));
+  EXPECT_THAT(names(), ElementsAre("", "follower", "", ""));
+}
+
+TEST_F(VexSubscription, AMissingNewGroupHandlerIsTraced) {
+  trace_only(trace_info);
+  subscribe(0);
+  ASSERT_EQ(1U, platform_double().traces.size());
+  EXPECT_EQ(320U, platform_double().traces[0].id);
+  EXPECT_EQ(1, platform_double().traces[0].category);
+}
+
+TEST_F(VexSubscription, AWrittenByteIsTracedWithTheDescriptor) {
+  make_pipe_handler();
+  trace_only(trace_info);
+  subscribe(0);
+  ASSERT_EQ(1U, platform_double().traces.size());
+  EXPECT_EQ(322U, platform_double().traces[0].id);
+  EXPECT_THAT(platform_double().traces[0].values, ElementsAre(static_cast<uint32_t>(handler->getWriteFd())));
+}
+
+TEST_F(VexSubscription, AFailedWriteIsTracedWithItsResultAndTheSystemError) {
+  make_handler(open("/dev/null", O_RDONLY), open("/dev/null", O_RDONLY));
+  trace_only(trace_info);
+  subscribe(2);
+  ASSERT_EQ(1U, platform_double().traces.size());
+  EXPECT_EQ(321U, platform_double().traces[0].id);
+  EXPECT_THAT(platform_double().traces[0].values, ElementsAre(0xFFFFFFFFU, static_cast<uint32_t>(EBADF)));
+}
+
+TEST_F(VexSubscription, WithTheInfoCategoryOffNothingIsTraced) {
+  trace_nothing();
+  subscribe(0);
+  make_pipe_handler();
+  platform_double().traces.clear();
+  subscribe(0);
+  EXPECT_THAT(platform_double().traces, IsEmpty());
+}
+
+TEST_F(VexSubscription, AWriteToAClosedPipeFailsAndKeepsTheSystemError) {
+  signal(SIGPIPE, SIG_IGN);
+  int ends[2];
+  ASSERT_EQ(0, pipe(ends));
+  close(ends[0]);
+  make_handler(open("/dev/null", O_RDONLY), ends[1]);
+  errno = 0;
+  EXPECT_TRUE(fails_with(59, [&] { return subscribe(1); }));
+  EXPECT_EQ(EPIPE, errno);
+  EXPECT_THAT(names(), ElementsAre("follower", "", "", ""));
+  signal(SIGPIPE, SIG_DFL);
+}
+
+TEST_F(VexSubscription, AFailedWriteForANetworkKeepsTheSystemErrorToo) {
+  make_handler(open("/dev/null", O_RDONLY), open("/dev/null", O_RDONLY));
+  errno = 0;
+  EXPECT_TRUE(fails_with(59, [&] { return subscribe(5); }));
+  EXPECT_EQ(EBADF, errno);
+  EXPECT_THAT(names(), ElementsAre("", "follower", "", ""));
+}
+
+TEST_F(VexSubscription, ASystemErrorIsKeptAlsoWhileTracing) {
+  make_handler(open("/dev/null", O_RDONLY), open("/dev/full", O_WRONLY));
+  trace_only(trace_info);
+  EXPECT_TRUE(fails_with(59, [&] { return subscribe(3); }));
+  EXPECT_EQ(ENOSPC, errno);
+}
+
+TEST_F(VexSubscription, ANewSubscriptionReplacesTheNameOfItsKind) {
+  make_pipe_handler();
+  set_name(nodeEventSubscriptionName, "a much longer name than before");
+  EXPECT_EQ(Hb_Success, subscribe(0));
+  EXPECT_STREQ("follower", nodeEventSubscriptionName);
+}
+
+TEST_F(VexSubscription, ANameOf31CharactersIsKeptWhole) {
+  char name[] = "abcdefghijklmnopqrstuvwxyz12345";
+  ASSERT_EQ(31U, std::strlen(name));
+  Hb_Subscription_Group group = group_of_type(9);
+  EXPECT_EQ(Hb_Success, hb_subscribe(name, &group, 1));
+  EXPECT_STREQ("abcdefghijklmnopqrstuvwxyz12345", splitMergeEventSubscriptionName);
+}
+
+TEST_F(VexSubscription, ANameBeyond31CharactersIsCutThereInEachSlot) {
+  make_pipe_handler();
+  char name[] = "abcdefghijklmnopqrstuvwxyz123456789 and more of it, well beyond the slot";
+  for (const int32_t type : {0, 5, 7, 9}) {
+    Hb_Subscription_Group group = group_of_type(type);
+    set_count(group, 1);
+    EXPECT_EQ(Hb_Success, hb_subscribe(name, &group, 1));
+  }
+  EXPECT_THAT(names(), testing::Each("abcdefghijklmnopqrstuvwxyz12345"));
+}
+
+TEST_F(VexSubscription, TheTypeIsPutBackAlsoWhenTheCallFails) {
+  Hb_Subscription_Group group = group_of_type(2);
+  set_count(group, 5);
+  char name[] = "follower";
+  EXPECT_TRUE(fails_with(89, [&] { return hb_subscribe(name, &group, 1); }));
+  EXPECT_EQ(2, group.Hb_subscription_type);
+}
+
+TEST_F(VexSubscription, WithdrawingClearsEverySlotOfThatName) {
+  set_name(nodeEventSubscriptionName, "follower");
+  set_name(networkEventSubscriptionName, "another");
+  set_name(siteEventSubscriptionName, "follower");
+  set_name(splitMergeEventSubscriptionName, "follower");
+  char name[] = "follower";
+  EXPECT_EQ(Hb_Success, hb_unsubscribe(name));
+  EXPECT_THAT(names(), ElementsAre("", "another", "", ""));
+}
+
+TEST_F(VexSubscription, WithdrawingClearsTheNetworkSlotToo) {
+  set_name(networkEventSubscriptionName, "follower");
+  char name[] = "follower";
+  EXPECT_EQ(Hb_Success, hb_unsubscribe(name));
+  EXPECT_THAT(names(), ElementsAre("", "", "", ""));
+}
+
+TEST_F(VexSubscription, WithdrawingAnUnknownNameSucceedsAndClearsNothing) {
+  set_name(nodeEventSubscriptionName, "follower");
+  for (const char* other : {"followe", "followers", "Follower"}) {
+    std::string name = other;
+    EXPECT_EQ(Hb_Success, hb_unsubscribe(name.data()));
+  }
+  EXPECT_THAT(names(), ElementsAre("follower", "", "", ""));
+}
+
+TEST_F(VexSubscription, WithdrawingClears31BytesAndLeavesThe32nd) {
+  std::memset(siteEventSubscriptionName, 'x', 32);
+  std::memcpy(siteEventSubscriptionName, "follower", 9);
+  char name[] = "follower";
+  EXPECT_EQ(Hb_Success, hb_unsubscribe(name));
+  EXPECT_THAT(std::vector<char>(siteEventSubscriptionName, siteEventSubscriptionName + 31), testing::Each('\0'));
+  EXPECT_EQ('x', siteEventSubscriptionName[31]);
+  siteEventSubscriptionName[31] = '\0';
+}
+
+TEST_F(VexSubscription, ANullNameOrGroupIsRefused) {
+  Hb_Subscription_Group group = group_filled_with(0x3C, 9);
+  const Hb_Subscription_Group before = group;
+  char name[] = "follower";
+  EXPECT_TRUE(fails_with(4, [&] { return hb_subscribe(nullptr, &group, 1); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_subscribe(name, nullptr, 1); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_unsubscribe(nullptr); }));
+  EXPECT_TRUE(same_bytes(before, group));
+}
+
+}  // namespace
+}  // namespace hb_test

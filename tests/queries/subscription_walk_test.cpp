@@ -1,0 +1,164 @@
+// Walking the members of a subscription group.
+#include <gmock/gmock.h>
+
+#include "subscription_record.h"
+
+namespace hb_test {
+namespace {
+
+using testing::ElementsAre;
+
+TEST_F(Subscription, AdaptersAreWalkedAscendingToTheEnd) {
+  Hb_Subscription_Group group = group_of_type(4);
+  hb_add_all_adapters_to_subscription_group(&group);
+  std::vector<Hb_Adapter_Number> walked;
+  Hb_Adapter_Number adapter = 0;
+  for (Hb_Rc rc = hb_get_first_subscription_adapter(&group, &adapter); rc == Hb_Success;
+       rc = hb_get_next_subscription_adapter(&group, &adapter)) {
+    walked.push_back(adapter);
+    EXPECT_EQ(static_cast<Hb_Cursor>(adapter) + 1, group.Hb_cursor);
+  }
+  EXPECT_THAT(walked, ElementsAre(0, 2, 12, 13, 17));
+  EXPECT_EQ(0xFFFFFFFFU, adapter);
+  EXPECT_EQ(1, hb_get_errno());
+  EXPECT_EQ(18, group.Hb_cursor);
+}
+
+TEST_F(Subscription, NodesAreWalkedAscendingToTheEnd) {
+  Hb_Subscription_Group group = group_of_type(4);
+  hb_add_all_nodes_to_subscription_group(&group);
+  std::vector<Hb_Node_Number> walked;
+  Hb_Node_Number node = 0;
+  for (Hb_Rc rc = hb_get_first_subscription_node(&group, &node); rc == Hb_Success;
+       rc = hb_get_next_subscription_node(&group, &node)) {
+    walked.push_back(node);
+    EXPECT_EQ(node + 1, group.Hb_cursor);
+  }
+  EXPECT_THAT(walked, ElementsAre(0, 3, 4));
+  EXPECT_EQ(-1, node);
+  EXPECT_EQ(1, hb_get_errno());
+  EXPECT_EQ(5, group.Hb_cursor);
+}
+
+TEST_F(Subscription, SitesAreWalkedAscendingToTheEnd) {
+  configure_sites({true, true});
+  Hb_Subscription_Group group = group_of_type(4);
+  hb_add_all_sites_to_subscription_group(&group);
+  Hb_Site_Number site = 99;
+  EXPECT_EQ(Hb_Success, hb_get_first_subscription_site(&group, &site));
+  EXPECT_EQ(0, site);
+  EXPECT_EQ(1, group.Hb_cursor);
+  EXPECT_EQ(Hb_Success, hb_get_next_subscription_site(&group, &site));
+  EXPECT_EQ(1, site);
+  EXPECT_EQ(2, group.Hb_cursor);
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_subscription_site(&group, &site); }));
+  EXPECT_EQ(65535, site);
+  EXPECT_EQ(2, group.Hb_cursor);
+}
+
+TEST_F(Subscription, ANextCallAfterTheLastNodeKeepsFailing) {
+  Hb_Subscription_Group group = group_of_type(4);
+  hb_add_node_to_subscription_group(&group, 4);
+  Hb_Node_Number node = 0;
+  hb_get_first_subscription_node(&group, &node);
+  for (int call = 0; call < 3; ++call) {
+    node = 77;
+    EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_subscription_node(&group, &node); }));
+    EXPECT_EQ(-1, node);
+  }
+}
+
+TEST_F(Subscription, AFirstCallStartsAgainWhateverTheCursor) {
+  Hb_Subscription_Group group = group_of_type(4);
+  hb_add_all_adapters_to_subscription_group(&group);
+  group.Hb_cursor = 1000;
+  Hb_Adapter_Number adapter = 99;
+  EXPECT_EQ(Hb_Success, hb_get_first_subscription_adapter(&group, &adapter));
+  EXPECT_EQ(0U, adapter);
+}
+
+TEST_F(Subscription, AWalkOfNoMembersLeavesTheCursor) {
+  Hb_Subscription_Group group = group_of_type(2);
+  group.Hb_cursor = 55;
+  Hb_Adapter_Number adapter = 99;
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_first_subscription_adapter(&group, &adapter); }));
+  EXPECT_EQ(0xFFFFFFFFU, adapter);
+  EXPECT_EQ(55, group.Hb_cursor);
+}
+
+TEST_F(Subscription, MembersAtTheBoundOfTheClusterAreNotWalked) {
+  Hb_Subscription_Group adapters = group_of_type(2);
+  set_member(adapters, 31);
+  set_member(adapters, 32);
+  Hb_Adapter_Number adapter = 0;
+  EXPECT_EQ(Hb_Success, hb_get_first_subscription_adapter(&adapters, &adapter));
+  EXPECT_EQ(31U, adapter);
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_subscription_adapter(&adapters, &adapter); }));
+
+  Hb_Subscription_Group nodes = group_of_type(0);
+  set_member(nodes, 7);
+  set_member(nodes, 8);
+  Hb_Node_Number node = 0;
+  EXPECT_EQ(Hb_Success, hb_get_first_subscription_node(&nodes, &node));
+  EXPECT_EQ(7, node);
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_subscription_node(&nodes, &node); }));
+
+  Hb_Subscription_Group sites = group_of_type(7);
+  set_member(sites, 2);
+  Hb_Site_Number site = 0;
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_first_subscription_site(&sites, &site); }));
+}
+
+TEST_F(Subscription, MembersAreWalkedWithoutAskingTheConfiguration) {
+  Hb_Subscription_Group group = group_of_type(2);
+  set_member(group, 1);
+  Hb_Adapter_Number adapter = 0;
+  EXPECT_EQ(Hb_Success, hb_get_first_subscription_adapter(&group, &adapter));
+  EXPECT_EQ(1U, adapter);
+}
+
+TEST_F(Subscription, OnlyAGroupOfAdaptersIsWalkedByAdapter) {
+  for (int32_t type = 0; type <= 9; ++type) {
+    if (type == 2) continue;
+    Hb_Subscription_Group group = group_filled_with(0xFF, type);
+    Hb_Adapter_Number adapter = 99;
+    EXPECT_TRUE(fails_with(11, [&] { return hb_get_first_subscription_adapter(&group, &adapter); })) << type;
+    EXPECT_TRUE(fails_with(11, [&] { return hb_get_next_subscription_adapter(&group, &adapter); })) << type;
+    EXPECT_EQ(-1, group.Hb_cursor);
+  }
+}
+
+TEST_F(Subscription, OnlyAGroupOfNodesIsWalkedByNode) {
+  for (int32_t type = 1; type <= 9; ++type) {
+    Hb_Subscription_Group group = group_filled_with(0xFF, type);
+    Hb_Node_Number node = 99;
+    EXPECT_TRUE(fails_with(11, [&] { return hb_get_first_subscription_node(&group, &node); })) << type;
+    EXPECT_TRUE(fails_with(11, [&] { return hb_get_next_subscription_node(&group, &node); })) << type;
+  }
+}
+
+TEST_F(Subscription, OnlyAGroupOfSitesIsWalkedBySite) {
+  for (int32_t type = 0; type <= 9; ++type) {
+    if (type == 7) continue;
+    Hb_Subscription_Group group = group_filled_with(0xFF, type);
+    Hb_Site_Number site = 99;
+    EXPECT_TRUE(fails_with(11, [&] { return hb_get_first_subscription_site(&group, &site); })) << type;
+    EXPECT_TRUE(fails_with(11, [&] { return hb_get_next_subscription_site(&group, &site); })) << type;
+  }
+}
+
+TEST_F(Subscription, ANullOutputIsRefused) {
+  Hb_Subscription_Group group = group_filled_with(0xFF, 2);
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_first_subscription_adapter(&group, nullptr); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_next_subscription_adapter(&group, nullptr); }));
+  group = group_filled_with(0xFF, 0);
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_first_subscription_node(&group, nullptr); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_next_subscription_node(&group, nullptr); }));
+  group = group_filled_with(0xFF, 7);
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_first_subscription_site(&group, nullptr); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_next_subscription_site(&group, nullptr); }));
+  EXPECT_EQ(-1, group.Hb_cursor);
+}
+
+}  // namespace
+}  // namespace hb_test
