@@ -58,12 +58,12 @@ void wait_for(int descriptor, Wait wait, int seconds) {
   }
 }
 
-BareClient::BareClient(const Peer& peer) : socket_(socket(AF_UNIX, SOCK_STREAM, 0)) {
+BareClient::BareClient(const std::string& socket_path) : socket_(socket(AF_UNIX, SOCK_STREAM, 0)) {
   set_buffers(socket_.get());
   sockaddr_un address{};
   address.sun_family = AF_UNIX;
-  std::memcpy(address.sun_path, peer.socket_path().c_str(), peer.socket_path().size() + 1);
-  const auto length = static_cast<socklen_t>(peer.socket_path().size() + 2);
+  std::memcpy(address.sun_path, socket_path.c_str(), socket_path.size() + 1);
+  const auto length = static_cast<socklen_t>(socket_path.size() + 2);
   if (connect(socket_.get(), reinterpret_cast<sockaddr*>(&address), length) != 0) throw_errno("connect");
 }
 

@@ -18,7 +18,7 @@ void wait_for(int descriptor, Wait wait, int seconds);
 class BareClient {
  public:
   // Connects with the socket buffers of the library.
-  explicit BareClient(const Peer& peer);
+  explicit BareClient(const std::string& socket_path);
 
   int descriptor() const { return socket_.get(); }
 

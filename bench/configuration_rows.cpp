@@ -50,7 +50,7 @@ class BareLoad {
   explicit BareLoad(const Peer& peer) : request_(bare_configuration_request()) { load(peer); }
 
   void load(const Peer& peer) {
-    client_ = std::make_unique<BareClient>(peer);
+    client_ = std::make_unique<BareClient>(peer.socket_path());
     client_->send(request_);
     fill(client_->receive());
   }
@@ -112,7 +112,7 @@ void reload_with_library(const Client& client, Outputs& outputs) {
 void compare_reload(const Compare& compare) {
   const Peer peer(full_size);
   const Client client(peer);
-  const BareClient bare(peer);
+  const BareClient bare(peer.socket_path());
   const Descriptor bare_end = peer.accept();
   const Bytes update = framed(configuration(HB_CONFIGURATION_UPDATE, full_size));
   Feed our_feed(client.daemon_end());

@@ -60,7 +60,7 @@ Contender bare_side(const BareClient& client, Outputs& outputs, Feed& feed, cons
 void compare_event(const EventRow& row, Wait wait, const Compare& compare) {
   const Peer peer(row.cluster);
   const Client client(peer);
-  const BareClient bare(peer);
+  const BareClient bare(peer.socket_path());
   const Descriptor bare_end = peer.accept();
   const Bytes bytes = framed(row.event);
   auto our_outputs = std::make_unique<Outputs>();

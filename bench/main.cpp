@@ -35,7 +35,7 @@ int main(int argc, char** argv) {
   benchmark::Initialize(&argc, argv);
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;
   std::signal(SIGPIPE, SIG_IGN);
-  bench::remove_segments_on_signals();
+  bench::clear_up_on_signals();
   const int processor = chosen_processor();
   if (!pin_to(processor)) {
     std::fprintf(stderr, "hb_bench: cannot run on processor %d; name another one in HB_BENCH_CPU\n", processor);
@@ -50,6 +50,10 @@ int main(int argc, char** argv) {
   bench::add_request_rows();
   bench::add_notification_rows();
   bench::add_memory_rows();
+#ifdef HB_BENCH_DAEMON
+  bench::add_daemon_rows();
+  bench::add_daemon_memory_rows();
+#endif
   benchmark::RunSpecifiedBenchmarks();
   benchmark::Shutdown();
   return 0;

@@ -3,9 +3,7 @@
 #include <sys/socket.h>
 #include <sys/un.h>
 
-#include <cstdlib>
 #include <cstring>
-#include <filesystem>
 #include <stdexcept>
 
 #include "hb_protocol/framing.h"
@@ -38,17 +36,6 @@ void skip_request(int end) {
 }
 
 }  // namespace
-
-Directory::Directory() {
-  std::string name = (std::filesystem::temp_directory_path() / "hb_bench.XXXXXX").string();
-  if (mkdtemp(name.data()) == nullptr) throw_errno("mkdtemp " + name);
-  path_ = name;
-}
-
-Directory::~Directory() {
-  std::error_code ignored;
-  std::filesystem::remove_all(path_, ignored);
-}
 
 Peer::Peer(const Cluster& cluster)
     : socket_path_(directory_.path() + "/socket"),

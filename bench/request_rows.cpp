@@ -1,12 +1,10 @@
 // Sending requests.
-#include <sys/socket.h>
-
-#include <cerrno>
 #include <memory>
 
 #include "bare_client.h"
 #include "client.h"
 #include "rows.h"
+#include "subscriber.h"
 
 namespace bench {
 namespace {
@@ -17,29 +15,21 @@ constexpr size_t withdrawals = 24;
 
 char subscription_name[] = "benchmark";
 
-// Empties the daemon's end.
-void drain(const Descriptor& end) {
-  static Bytes room(1U << 20);
-  while (recv(end.get(), room.data(), room.size(), MSG_DONTWAIT) > 0) {
-  }
-  if (errno != EAGAIN && errno != EWOULDBLOCK) throw_errno("recv");
-}
-
 Bytes bare_request(size_t data) { return framed(Bytes(HB_REQUEST_HEADER_SIZE + data, 'x')); }
 
 void compare_requests(const Compare& compare, size_t batch, size_t data, const std::function<void()>& request) {
   const Peer peer(full_size);
   const Client client(peer);
-  const BareClient bare(peer);
+  const BareClient bare(peer.socket_path());
   const Descriptor bare_end = peer.accept();
   Bytes bytes = bare_request(data);
-  compare({.prepare = [&] { drain(client.daemon_end()); },
+  compare({.prepare = [&] { drain(client.daemon_end().get()); },
            .run =
                [&] {
                  for (size_t sent = 0; sent < batch; ++sent) request();
                },
            .operations = batch},
-          {.prepare = [&] { drain(bare_end); },
+          {.prepare = [&] { drain(bare_end.get()); },
            .run =
                [&] {
                  for (size_t sent = 0; sent < batch; ++sent) bare.send(bytes);

@@ -32,7 +32,8 @@ void add_look_up_rows();
 void add_walk_rows();
 void add_request_rows();
 void add_notification_rows();
-void add_daemon_rows();
 void add_memory_rows();
+void add_daemon_rows();
+void add_daemon_memory_rows();
 
 }  // namespace bench

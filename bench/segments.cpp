@@ -24,7 +24,8 @@ key_t key_of(const std::string& socket_path, int project) {
 
 Segments* Segments::present_ = nullptr;
 
-Segments::Segments(const std::string& socket_path, const Cluster& cluster) {
+Segments::Segments(const std::string& socket_path, const Cluster& cluster)
+    : socket_path_(socket_path), directory_(socket_path.substr(0, socket_path.rfind('/'))) {
   present_ = this;
   try {
     publish(socket_path, cluster);
@@ -73,11 +74,15 @@ void Segments::remove() {
 }
 
 void Segments::remove_and_exit(int signal) {
-  if (present_ != nullptr) present_->remove();
+  if (Segments* present = present_; present != nullptr) {
+    present->remove();
+    unlink(present->socket_path_.c_str());
+    rmdir(present->directory_.c_str());
+  }
   _exit(128 + signal);
 }
 
-void remove_segments_on_signals() {
+void clear_up_on_signals() {
   for (const int signal : {SIGINT, SIGTERM, SIGHUP}) std::signal(signal, Segments::remove_and_exit);
 }
 

@@ -8,8 +8,8 @@
 
 namespace bench {
 
-// From now on a signal that ends the process removes what is there of all segments first.
-void remove_segments_on_signals();
+// From now on a signal that ends the process first removes what is there of segments, with their socket.
+void clear_up_on_signals();
 
 class Segments {
  public:
@@ -20,7 +20,7 @@ class Segments {
   Segments& operator=(const Segments&) = delete;
 
  private:
-  friend void remove_segments_on_signals();
+  friend void clear_up_on_signals();
 
   void publish(const std::string& socket_path, const Cluster& cluster);
   int make_segment(const std::string& socket_path, int project, size_t size);
@@ -30,6 +30,8 @@ class Segments {
 
   static Segments* present_;  // what a signal removes
 
+  std::string socket_path_;
+  std::string directory_;
   std::vector<int> segments_;
   int semaphores_ = -1;
 };

@@ -56,7 +56,7 @@ void take_one(const Client& client, Outputs& outputs) {
 void compare_turns(const TurnRow& row, const Compare& compare) {
   const Peer peer(row.cluster);
   const Client client(peer);
-  const BareClient bare(peer);
+  const BareClient bare(peer.socket_path());
   const Descriptor bare_end = peer.accept();
   const Bytes bytes = framed(row.event);
   const TurnDaemon our_daemon(client.daemon_end(), bytes);
