@@ -3,6 +3,7 @@
 #include <arpa/inet.h>
 
 #include <algorithm>
+#include <cstddef>
 #include <memory>
 #include <new>
 
@@ -110,8 +111,10 @@ void install(Tables& tables, const hb_configuration_header& header, const Messag
   table.Hb_adapters_per_node = header.adapters_per_node;
   table.Hb_num_adapters = header.num_adapters;
   table.Hb_num_networks = header.num_networks;
-  table.Hb_rem_node_down_sim_period = header.rem_node_down_sim_period;
-  table.Hb_local_node_down_sim_period = header.local_node_down_sim_period;
+  // The periods are not aligned in the header: no reference to them may be made.
+  table.Hb_rem_node_down_sim_period = message.at<timeval>(offsetof(hb_configuration_header, rem_node_down_sim_period));
+  table.Hb_local_node_down_sim_period =
+      message.at<timeval>(offsetof(hb_configuration_header, local_node_down_sim_period));
   table.Hb_num_nodes = tables.node_count;
   table.Hb_global_adapter_list = tables.adapters.release();
   table.adap_hash = tables.by_number.release();

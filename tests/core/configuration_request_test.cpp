@@ -54,6 +54,15 @@ TEST_F(ConfigurationRequest, LoadsTheTableFromTheAnswer) {
   EXPECT_EQ(hb_get_adap_entry(5)->Hb_adapter_num, 5U);
 }
 
+TEST_F(ConfigurationRequest, LoadsThePeriodsFromWhereTheyLieUnaligned) {
+  peer.send_frame(configuration_answer(small_cluster().remote_period(0x100000001, 5).local_period(7, 0x200000003)));
+  EXPECT_EQ(hb_recv_config_info(nullptr), Hb_Success);
+  EXPECT_EQ(global_config_tbl.Hb_rem_node_down_sim_period.tv_sec, 0x100000001);
+  EXPECT_EQ(global_config_tbl.Hb_rem_node_down_sim_period.tv_usec, 5);
+  EXPECT_EQ(global_config_tbl.Hb_local_node_down_sim_period.tv_sec, 7);
+  EXPECT_EQ(global_config_tbl.Hb_local_node_down_sim_period.tv_usec, 0x200000003);
+}
+
 TEST_F(ConfigurationRequest, ReadsTheAnswerWithoutSelect) {
   daemon.run([this](FakeDaemon&) { peer.send_byte_by_byte(framed(configuration_answer(small_cluster()))); });
   SystemCalls calls;
