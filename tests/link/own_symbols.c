@@ -7,8 +7,8 @@
 
 /* As the library exports them, but the program's. */
 int prime(int number);
-void *Hash_init(const char *name, int size);
-void *Hash_search(unsigned name, void *table);
+void* Hash_init(const char* name, int size);
+void* Hash_search(unsigned name, void* table);
 
 static int calls = 0;
 
@@ -17,44 +17,44 @@ int prime(int number) {
   return number + 1;
 }
 
-void *Hash_init(const char *name, int size) {
+void* Hash_init(const char* name, int size) {
   ++calls;
   return name == NULL ? NULL : malloc((size_t)size);
 }
 
-void *Hash_search(unsigned name, void *table) {
+void* Hash_search(unsigned name, void* table) {
   ++calls;
   return name == 0 ? NULL : table;
 }
 
-static void fail(const char *what) {
+static void fail(const char* what) {
   fprintf(stderr, "%s\n", what);
   exit(1);
 }
 
 int main(void) {
-  if (dlsym(RTLD_DEFAULT, "prime") != (void *)(size_t)&prime) {
+  if (dlsym(RTLD_DEFAULT, "prime") != (void*)(size_t)&prime) {
     fail("the program's own names do not come first, so that this test shows nothing");
   }
   /* A table of the library's, searched and filled by its own functions, which call each other. */
-  void *library = dlopen("libhb_client.so.1", RTLD_NOW | RTLD_NOLOAD);
+  void* library = dlopen("libhb_client.so.1", RTLD_NOW | RTLD_NOLOAD);
   if (library == NULL) {
     fail("the library is not loaded under its soname");
   }
-  void *(*init)(const char *, int);
-  *(void **)&init = dlsym(library, "Hash_init");
-  void *(*insert)(unsigned, void *, void *);
-  *(void **)&insert = dlsym(library, "Hash_insert");
-  void *(*search)(unsigned, void *);
-  *(void **)&search = dlsym(library, "Hash_search");
+  void* (*init)(const char*, int);
+  *(void**)&init = dlsym(library, "Hash_init");
+  void* (*insert)(unsigned, void*, void*);
+  *(void**)&insert = dlsym(library, "Hash_insert");
+  void* (*search)(unsigned, void*);
+  *(void**)&search = dlsym(library, "Hash_search");
   int (*library_prime)(int);
-  *(void **)&library_prime = dlsym(library, "prime");
-  void (*release)(void *);
-  *(void **)&release = dlsym(library, "Hash_free");
+  *(void**)&library_prime = dlsym(library, "prime");
+  void (*release)(void*);
+  *(void**)&release = dlsym(library, "Hash_free");
   if (init == &Hash_init || library_prime == &prime) {
     fail("the library's names lead to the program");
   }
-  void *table = init("own", library_prime(300));
+  void* table = init("own", library_prime(300));
   int item = 0;
   insert(5, table, &item);
   if (search(5, table) != &item || library_prime(300) != 307) {
