@@ -1,0 +1,326 @@
+#!/usr/bin/env python3
+"""Writes the first inputs of the fuzz targets: make_corpus.py DIRECTORY
+
+Each target gets a directory of its own. An input is what the target's source says that it takes: most start with the
+64 bytes of support/hostile.h, and a packet follows.
+"""
+import struct
+import sys
+from pathlib import Path
+
+NO_ADAPTER = 0xFFFFFFFF
+CONFIGURATION, ADAPTER_DEATH, ADAPTER_JOIN, ADAPTER_NEW_GROUP = 0, 2, 3, 4
+NODE_DEATH, NODE_JOIN, NODE_NEW_GROUP, ROUTE, UPDATE = 5, 6, 7, 8, 9
+CONFIG_ADAPTER, GRACE, FAILURE_DATA, DIFFERENT_INSTANCE, STATE, HEARTBEAT = 10, 11, 12, 13, 14, 15
+ANSWERS = {CONFIGURATION, 1, ROUTE, CONFIG_ADAPTER, GRACE, STATE}
+SUBSCRIBE, UNSUBSCRIBE = 209, 210
+NODES, ALL_NODES, ADAPTERS, ALL_ADAPTERS, EMPTY, NETWORK = 0, 1, 2, 3, 4, 5
+
+
+def hostile(cursor=0, group_type=1, group_events=4, adapter=5, offset=1, subscription_type=EMPTY, count=0, events=7,
+            node=1, network=1, site=0, flags=0, address=b"service", members=b""):
+    """Arguments and fields that the target passes and overwrites."""
+    numbers = struct.pack("<iiiIiiiihhHH", cursor, group_type, group_events, adapter, offset, subscription_type, count,
+                          events, node, network, site, flags)
+    return numbers + address.ljust(16, b"\0") + members.ljust(8, b"\0")
+
+
+def packet(kind, message=b"", leader=4, incarnation=7, status=0, name=b"watch", value=0, ffdc=b"ffdc.0001", sequence=9):
+    """A packet of the daemon, without the length in front."""
+    header = struct.pack("<iIIIIi32si43sxI", kind, leader, 0, 0, incarnation, status, name, value, ffdc, sequence)
+    return header + message
+
+
+def framed(*packets):
+    return b"".join(struct.pack("<i", len(each)) + each for each in packets)
+
+
+def adapters(*entries):
+    return struct.pack("<i", len(entries) - 1) + b"".join(struct.pack("<II", *entry) for entry in entries)
+
+
+def nodes(*members):
+    return b"".join(struct.pack("<i", member) for member in members)
+
+
+def adapter(number, network=0, last_byte=1, kind=b"en0", state=1):
+    address = bytes(10) + b"\xff\xff" + bytes([10, 0, 0, last_byte])
+    return address + struct.pack("<h36sxxIi", network, kind, number, state)
+
+
+def configuration(records=(), networks=(b"service", b"standby"), local=1, max_nodes=6, per_node=4, adapter_count=None,
+                  network_count=None):
+    header = struct.pack("<iiiiiqqqq", local, max_nodes, per_node,
+                         len(records) if adapter_count is None else adapter_count,
+                         len(networks) if network_count is None else network_count, 30, 0, 20, 0)
+    return header + b"".join(records) + b"".join(struct.pack("<70s16s", name, b"ether") for name in networks)
+
+
+CONFIGURATIONS = {
+    "two-nodes": configuration([adapter(0), adapter(1, 1, 2), adapter(12, 0, 3)]),
+    "nothing": configuration([], []),
+    "no-node": configuration([adapter(0)], max_nodes=0),
+    "repeated-address": configuration([adapter(0), adapter(4)]),
+    "repeated-number": configuration([adapter(4, 0, 1), adapter(4, 1, 2)]),
+    "number-beyond-limit": configuration([adapter(24), adapter(98352), adapter(NO_ADAPTER)]),
+    "text-without-end": configuration([adapter(0, kind=b"x" * 36)], [b"n" * 70]),
+    "unused-network": configuration([adapter(0, 1)], [b"", b"second"]),
+    "most-networks": configuration([adapter(0)], [b"n%d" % i for i in range(48)], per_node=48),
+    "more-adapters-than-networks": configuration([adapter(60)], per_node=64),
+    "too-many-nodes": configuration(max_nodes=2050, per_node=1),
+    "most-nodes": configuration([adapter(2048)], max_nodes=2049, per_node=1),
+    "too-many-networks": configuration([], [b"n"] * 49),
+    "too-many-numbers": configuration(max_nodes=2049, per_node=49),
+    "no-adapter-per-node": configuration(per_node=0),
+    "negative-adapters": configuration([adapter(0)], adapter_count=-1),
+    "negative-networks": configuration([adapter(0)], network_count=-1),
+    "negative-nodes": configuration([adapter(0)], max_nodes=-1),
+    "negative-per-node": configuration([adapter(0)], per_node=-4),
+    "adapters-beyond-packet": configuration([adapter(0)], adapter_count=98352),
+    "networks-beyond-packet": configuration([adapter(0)], network_count=48),
+    "half-a-header": configuration()[:26],
+}
+
+ADAPTER_LISTS = {
+    "two": adapters((4, 1), (5, 0x08000005)),
+    "none": adapters(),
+    "unknown": adapters((3, 1), (23, 2)),
+    "beyond-limit": adapters((24, 1), (98351, 2), (98352, 3), (NO_ADAPTER, 4)),
+    "twice": adapters((4, 1), (4, NO_ADAPTER)),
+    "beyond-packet": struct.pack("<iII", 5, 4, 1),
+    "negative": struct.pack("<iII", -7, 4, 1),
+    "largest-count": struct.pack("<iII", 0x7FFFFFFF, 4, 1),
+    "nothing": b"",
+}
+
+NODE_LISTS = {
+    "three": nodes(1, 1, 0, 0, 1, 0),
+    "none": nodes(0, 0, 0, 0, 0, 0),
+    "neither-true-nor-false": nodes(1, 2, -1, 0x01000000, 1, 1),
+    "one-missing": nodes(1, 1, 1, 1, 1),
+    "more-than-there-are": nodes(*[1] * 9),
+}
+
+
+def adapter_events():
+    return {f"{kind}-{name}": packet(kind, message) for kind in (ADAPTER_DEATH, ADAPTER_JOIN, ADAPTER_NEW_GROUP)
+            for name, message in ADAPTER_LISTS.items()}
+
+
+def node_events():
+    events = {f"{kind}-{name}": packet(kind, message) for kind in (NODE_DEATH, NODE_JOIN, NODE_NEW_GROUP)
+              for name, message in NODE_LISTS.items()}
+    events["heartbeat"] = packet(HEARTBEAT, struct.pack("<iiii", 5, 0, 1, 4711))
+    events["short-heartbeat"] = packet(HEARTBEAT, bytes(15))
+    return events
+
+
+def other_events():
+    sender = bytes(10) + b"\xff\xff\x0a\0\0\x09" + struct.pack("<I", 3)
+    return {"failure-data": packet(FAILURE_DATA), "failure-data-without-end": packet(FAILURE_DATA, ffdc=b"f" * 43),
+            "no-failure-data": packet(FAILURE_DATA, ffdc=b""), "sender": packet(DIFFERENT_INSTANCE, sender),
+            "short-sender": packet(DIFFERENT_INSTANCE, sender[:19]),
+            "name-without-end": packet(DIFFERENT_INSTANCE, sender, name=b"n" * 32),
+            "half-a-header": packet(FAILURE_DATA)[:70]}
+
+
+def updates():
+    return {name: packet(UPDATE, message) for name, message in CONFIGURATIONS.items()}
+
+
+def answers():
+    return {f"kind-{kind}": packet(kind, struct.pack("<i", 2), value=kind % 10) for kind in sorted(ANSWERS) + [16, -1]}
+
+
+def with_hostile(packets, **fields):
+    return {name: hostile(**fields) + each for name, each in packets.items()}
+
+
+def of_kind(packets, *kinds):
+    return {name: each for name, each in packets.items() if struct.unpack_from("<i", each)[0] in kinds}
+
+
+def starts():
+    packets = {name: packet(CONFIGURATION, message) for name, message in CONFIGURATIONS.items()}
+    return with_hostile({**packets, "another-kind": packet(ROUTE), "empty": b"", "half-a-kind": b"\0\0"}, flags=6)
+
+
+def sequences():
+    def sequence(*packets):
+        return hostile(site=3) + b"".join(struct.pack("<H", len(each)) + each for each in packets)
+
+    events = list(adapter_events().values()) + list(node_events().values()) + list(other_events().values())
+    return {"events": sequence(*events[:12]), "updates": sequence(*list(updates().values())[:8]),
+            "shrinking": sequence(events[0], updates()["no-node"], events[0], updates()["two-nodes"], events[0]),
+            "answers": sequence(*answers().values())}
+
+
+def largest():
+    events = {**adapter_events(), **node_events(), **other_events()}
+    return {**with_hostile(events, flags=8, adapter=98351, node=2048, cursor=98351),
+            "all-nodes": hostile(flags=8) + packet(NODE_NEW_GROUP, nodes(*[1] * 2049)),
+            "last-adapters": hostile(cursor=98350) + packet(ADAPTER_JOIN, adapters((98350, 1), (98351, 2)))}
+
+
+def subscriptions():
+    def operations(*numbers, number=4, node=1, network=1, events=7):
+        return b"".join(struct.pack("<BBbbH", each, number, node, network, events) for each in numbers)
+
+    inputs = {f"type-{kind}": hostile(subscription_type=kind) + operations(*range(20)) for kind in range(-1, 11)}
+    for number in range(20):
+        inputs[f"operation-{number}"] = hostile() + operations(0, number, number, 18)
+    for events in (0x60, 0x100, 0x3000, 0x8000, 0, 0x7377):
+        inputs[f"events-{events:x}"] = hostile() + operations(1, 18, 18, events=events)
+    inputs["count-at-its-end"] = hostile(subscription_type=ADAPTERS, count=0x7FFFFFFF) + operations(4, 5, 4)
+    inputs["cursor-negative"] = hostile(subscription_type=ADAPTERS, cursor=-1, members=b"\xff" * 8) + operations(13, 12)
+    inputs["last-member"] = hostile(subscription_type=ADAPTERS, cursor=98351, members=b"\xff" * 8) + operations(13, 13)
+    return inputs
+
+
+def exchanges():
+    def exchange(answer, request=214, length=8, kind=10, flags=0, faults=b""):
+        return struct.pack("<iiiBB", request, length, kind, flags, len(faults)) + faults + answer
+
+    inputs = {f"{name}-{flags}": exchange(each, flags=flags) for name, each in answers().items() for flags in range(16)}
+    inputs["short"] = exchange(struct.pack("<i", CONFIG_ADAPTER), flags=15)
+    inputs["number-in-length"] = exchange(packet(ROUTE), request=206, length=98350, kind=ROUTE)
+    inputs["length-too-large"] = exchange(packet(ROUTE), request=206, length=98352, kind=ROUTE)
+    inputs["length-negative"] = exchange(packet(ROUTE), length=-4, flags=1)
+    for fault in range(16):
+        inputs[f"fault-{fault}"] = exchange(packet(STATE), kind=STATE, flags=2, faults=bytes([fault, fault << 4, fault]))
+        inputs[f"later-fault-{fault}"] = exchange(packet(STATE), kind=STATE, flags=7, faults=bytes([0, 0, fault, 0x27]))
+    return inputs
+
+
+def streams():
+    def session(stream, flags=1, at_start=b"", later=b""):
+        return bytes([flags, len(at_start), len(later)]) + at_start + later + stream
+
+    start = framed(packet(CONFIGURATION, CONFIGURATIONS["two-nodes"]))
+    events = framed(*adapter_events().values())
+    inputs = {"from-the-start": session(start + events, flags=0), "events": session(events),
+              "nodes": session(framed(*node_events().values())), "others": session(framed(*other_events().values())),
+              "updates": session(framed(*updates().values())), "answers": session(framed(*answers().values()), flags=3)}
+    for length in (0, 1, 107, -1, -0x80000000, 0x7FFFFFFF, 0x100000):
+        inputs[f"length-{length}"] = session(struct.pack("<i", length) + packet(FAILURE_DATA)[:107])
+    inputs["cut-in-length"] = session(events[:2])
+    inputs["cut-behind-length"] = session(events[:4])
+    inputs["byte-by-byte"] = session(events, later=b"\x07" * 63)
+    inputs["large-frame"] = session(struct.pack("<i", 0x100000), flags=0xB5)
+    for fault in range(1, 16):
+        inputs[f"fault-{fault}"] = session(events, flags=5, later=bytes([fault, 0, fault | 0x20, fault]))
+        for step in range(14):
+            inputs[f"fault-{fault}-at-{step}"] = session(start, flags=0, at_start=bytes([0] * step + [fault]))
+    return inputs
+
+
+def segments():
+    def publication(sequence=1, node_count=4, adapter_count=8, routes=4, script=b""):
+        return struct.pack("<IIIHxx", sequence, node_count, adapter_count, routes) + script
+
+    inputs = {"good": publication(), "no-node": publication(node_count=0, routes=0),
+              "more-nodes-than-routes": publication(node_count=5),
+              "hostile-nodes": publication(node_count=0xFFFFFFFF)}
+    for step in range(11):
+        for fault in range(1, 8):
+            inputs[f"fault-{fault}-at-{step}"] = publication(script=bytes([0] * step + [fault]))
+    return inputs
+
+
+def hash_operations():
+    inputs = {}
+    for kind in range(3):
+        for size in (-1, 0, 256, 257, 300, 599):
+            steps = bytes([0, 1, 1, 5, 2, 9, 5, 1, 3, 1, 6, 0, 0, 0xC1, 5, 0x55, 4, 5, 0xF7, 0, 0, 7, 6, 0])
+            inputs[f"kind-{kind}-size-{size}"] = struct.pack("<Bh", kind, size) + steps
+    return inputs
+
+
+def keys():
+    def key(length, value, claimed=None):
+        marshalled = struct.pack("<III", 1, 2, length) + value
+        return struct.pack("<h", len(marshalled) if claimed is None else claimed) + marshalled
+
+    return {"good": key(8, b"8 bytes."), "empty": key(0, b""), "longest": key(244, bytes(244)),
+            "too-long": key(245, bytes(245)), "length-too-small": key(7, b"8 bytes."),
+            "length-too-large": key(0xFFFFFFFF, b"8 bytes."), "negative": key(8, b"8 bytes.", -1),
+            "header-alone": key(0, b"", 11)}
+
+
+def requests():
+    def request(code, data=b"", length=None):
+        header = struct.pack("<iiiihh", 0, 0, code, len(data) if length is None else length, 0, 0)
+        return header + bytes(44) + struct.pack("<iii", 4711, 0, 0) + data
+
+    def subscription(kind, name=b"watch", events=7, count=2, members=b"\x0c"):
+        record = struct.pack("<iii32shxxi", kind, 0, events, name, 0, count) + members
+        return request(SUBSCRIBE, record.ljust(12348, b"\0"))
+
+    inputs = {f"code-{code}-{size}": request(code, bytes(size)) for code in range(200, 229) for size in (0, 1, 2, 4, 8)}
+    inputs.update({f"subscription-{kind}": subscription(kind) for kind in range(-1, 11)})
+    inputs["name-without-end"] = subscription(NETWORK, name=b"n" * 32)
+    inputs["all-members"] = subscription(ADAPTERS, members=b"\xff" * 12294)
+    inputs["unsubscribe"] = request(UNSUBSCRIBE, b"watch\0")
+    inputs["unsubscribe-without-end"] = request(UNSUBSCRIBE, b"watch")
+    inputs["number-in-length"] = request(206, bytes(7))
+    inputs["length-too-large"] = request(206, bytes(7), 98352)
+    inputs["length-negative"] = request(206, bytes(7), -1)
+    inputs["half-a-header"] = request(201)[:40]
+    return inputs
+
+
+def request_streams():
+    def stream(cuts, *packets):
+        return bytes([len(cuts)]) + bytes(cuts) + framed(*packets)
+
+    packets = [each for each in requests().values() if 76 <= len(each) < 1000]
+    return {"whole": stream([], *packets[:5]), "cut": stream([1, 3, 5, 7, 80, 200], *packets[:5]),
+            "empty-packet": stream([4], b"", packets[0]), "no-length": bytes([0]) + b"\x50\0",
+            "too-long": bytes([0]) + struct.pack("<i", 98428) + packets[0],
+            "negative": bytes([0]) + struct.pack("<i", -1) + packets[0]}
+
+
+def scenarios():
+    directory = Path(__file__).parent.parent / "daemon" / "scenarios"
+    inputs = {path.stem: path.read_bytes() for path in sorted(directory.glob("*.toml"))}
+    for name, text in list(inputs.items()):
+        for i, paragraph in enumerate(text.split(b"\n\n")):
+            inputs[f"{name}-{i}"] = paragraph
+    return inputs
+
+
+CORPORA = {
+    "adapter_event": lambda: with_hostile(adapter_events(), cursor=5),
+    "awaited_reply": exchanges,
+    "configuration_at_start": starts,
+    "configuration_update": lambda: with_hostile(updates(), flags=6),
+    "daemon_request": requests,
+    "daemon_stream": request_streams,
+    "different_instance": lambda: with_hostile(of_kind(other_events(), DIFFERENT_INSTANCE), group_type=2,
+                                               group_events=256),
+    "event_sequence": sequences,
+    "failure_data": lambda: with_hostile(of_kind(other_events(), FAILURE_DATA), group_events=8),
+    "hash": hash_operations,
+    "largest_cluster": largest,
+    "node_event": lambda: with_hostile(node_events(), group_type=0),
+    "scenario": scenarios,
+    "shared_segments": segments,
+    "stream": streams,
+    "subscription": subscriptions,
+    "typed_key": keys,
+    "unawaited_kind": lambda: with_hostile(answers()),
+}
+
+
+def main():
+    if len(sys.argv) != 2:
+        sys.exit("make_corpus.py: say where the inputs are to be written: make_corpus.py DIRECTORY")
+    for target, inputs in CORPORA.items():
+        directory = Path(sys.argv[1]) / f"fuzz_{target}"
+        directory.mkdir(parents=True, exist_ok=True)
+        for name, content in inputs().items():
+            (directory / name).write_bytes(content)
+
+
+if __name__ == "__main__":
+    main()
