@@ -164,7 +164,7 @@ def largest():
 
 def subscriptions():
     def operations(*numbers, number=4, node=1, network=1, events=7):
-        return b"".join(struct.pack("<BBbbH", each, number, node, network, events) for each in numbers)
+        return b"".join(struct.pack("<BBhhH", each, number, node, network, events) for each in numbers)
 
     inputs = {f"type-{kind}": hostile(subscription_type=kind) + operations(*range(20)) for kind in range(-1, 11)}
     for number in range(20):

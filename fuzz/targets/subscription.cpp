@@ -21,8 +21,8 @@ fuzz::Configuration_Model start() {
 struct Operation {
   uint8_t number;
   uint8_t adapter;
-  int8_t node;
-  int8_t network;
+  int16_t node;
+  int16_t network;
   uint16_t events;
 };
 
