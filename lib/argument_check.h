@@ -12,7 +12,7 @@ bool all_given(const Pointers*... pointers) {
 // Fails as hb_init() does, or with HB_EINVAL for a null pointer.
 template <typename... Pointers>
 Hb_Rc start_with(const Pointers*... pointers) {
-  if (hb_init() != Hb_Success) {
+  if (client_initialized != Hb_True && hb_init() != Hb_Success) {
     return Hb_Failure;
   }
   return all_given(pointers...) ? Hb_Success : fail(HB_EINVAL);

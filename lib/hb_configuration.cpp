@@ -9,13 +9,14 @@
 #include "argument_check.h"
 #include "hb_global_data/address_text.h"
 #include "hb_global_data/node_table.h"
+#include "hb_global_data/record_index.h"
 #include "network_slots.h"
 
 namespace {
 
 const Hb_Configuration_Internal& table() { return global_config_tbl; }
 
-bool is_configured(Hb_Adapter_Number adapter) { return hb_get_adap_entry(adapter) != &HB_INVALID_ADAP; }
+bool is_configured(Hb_Adapter_Number adapter) { return find_configured_adapter(adapter) != nullptr; }
 
 Hb_Adapter_Number adapter_in_slot(int node, int offset) {
   return static_cast<Hb_Adapter_Number>(node) * static_cast<Hb_Adapter_Number>(table().Hb_adapters_per_node) +
@@ -28,8 +29,8 @@ Hb_Adapter* find_adapter(Hb_Adapter_Number adapter) {
     set_hb_errno(HB_EINVAL);
     return nullptr;
   }
-  Hb_Adapter* record = hb_get_adap_entry(adapter);
-  if (record == &HB_INVALID_ADAP) {
+  Hb_Adapter* record = find_configured_adapter(adapter);
+  if (record == nullptr) {
     set_hb_errno(HB_ENOADAPTER);
     return nullptr;
   }
@@ -131,6 +132,12 @@ Hb_Rc process_site_number_list(Hb_Site_Number* site, Hb_Cursor* cursor, int tran
       [](int position) { return static_cast<Hb_Site_Number>(position); });
 }
 
+[[gnu::cold, gnu::noinline]] void trace_address(Hb_IP_address6* address, Hb_Adapter_Number adapter) {
+  char text[INET6_ADDRSTRLEN];
+  mowllib_ntop(address, text);
+  trace_data(Trace_Info, trace_address_of_adapter, {text, text_length(text)}, {&adapter, sizeof adapter});
+}
+
 Hb_Rc get_number(int value, int* number) {
   *number = value;
   return Hb_Success;
@@ -227,9 +234,7 @@ Hb_Rc hb_get_adapter_address_by_number(Hb_Adapter_Number adapter, Hb_IP_address6
   }
   *address = record->Hb_ip_address;
   if (trace_is_on(Trace_Info)) {
-    char text[INET6_ADDRSTRLEN];
-    mowllib_ntop(address, text);
-    trace_data(Trace_Info, trace_address_of_adapter, {text, text_length(text)}, {&adapter, sizeof adapter});
+    trace_address(address, adapter);
   }
   return Hb_Success;
 }

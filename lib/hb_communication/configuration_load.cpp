@@ -10,6 +10,7 @@
 #include "VEX_HBC_trace.h"
 #include "hb_global_data/address_text.h"
 #include "hb_global_data/node_table.h"
+#include "hb_global_data/record_index.h"
 #include "hb_protocol/configuration_message.h"
 
 namespace {
@@ -104,6 +105,16 @@ void build(Tables& tables, const hb_configuration_header& header, const Message&
   std::for_each_n(tables.adapters.get(), count, [&](Hb_Adapter& adapter) { add_adapter(tables, header, adapter); });
 }
 
+// A number that comes twice leads to its last record, as it does in the tables.
+void index_records(const Hb_Configuration_Internal& table) {
+  adapter_index.start(table.adap_hash, adapter_number_limit(table));
+  std::for_each_n(table.Hb_global_adapter_list, table.Hb_num_adapters,
+                  [](Hb_Adapter& adapter) { adapter_index.add(adapter.Hb_adapter_num, adapter); });
+  node_index.start(table.node_hash, static_cast<uint32_t>(table.Hb_max_nodes));
+  std::for_each_n(table.node_list, table.Hb_num_nodes,
+                  [](Hb_Node_config_state& node) { node_index.add(static_cast<uint32_t>(node.node_num), node); });
+}
+
 void install(Tables& tables, const hb_configuration_header& header, const Message& message) {
   Hb_Configuration_Internal& table = global_config_tbl;
   table.local_node_number = static_cast<Hb_Node_Number>(header.local_node_number);
@@ -123,6 +134,7 @@ void install(Tables& tables, const hb_configuration_header& header, const Messag
   table.ip_hash = tables.by_address.release();
   message.copy(table.Hb_global_network_list, adapters_end(header),
                static_cast<size_t>(header.num_networks) * sizeof(Hb_Network));
+  index_records(table);
 }
 
 // Builds beside the table in force, so that a failure changes nothing, and calls make_room before the exchange.

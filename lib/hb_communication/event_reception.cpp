@@ -7,6 +7,7 @@
 #include "VEX_HBC_trace.h"
 #include "hb_communication/configuration_load.h"
 #include "hb_communication/connection.h"
+#include "hb_global_data/record_index.h"
 #include "hb_global_data/vex_event_queue.h"
 
 Hb_client_hb_info_t client_hb_info = {};
@@ -70,20 +71,19 @@ bool is_whole(const Packet& packet) {
 }
 
 void set_adapter_state(Hb_Adapter_Number number, Hb_Entity_State state) {
-  void* found = Hash_search(number, global_config_tbl.adap_hash);
+  Hb_Adapter* found = find_configured_adapter(number);
   if (found != nullptr) {
-    static_cast<Hb_Adapter*>(found)->Hb_state = state;
+    found->Hb_state = state;
   }
 }
 
 void set_node_state(int node, bool up) {
-  void* found = Hash_search(static_cast<uint32_t>(node), global_config_tbl.node_hash);
-  if (found == nullptr) {
+  Hb_Node_config_state* entry = find_configured_node(static_cast<uint32_t>(node));
+  if (entry == nullptr) {
     return;
   }
-  auto& entry = *static_cast<Hb_Node_config_state*>(found);
-  entry.state = up ? Hb_Entity_Up : Hb_Entity_Down;
-  entry.reason = up ? Hb_Entity_State_Reason_Up : Hb_Entity_State_Reason_Down;
+  entry->state = up ? Hb_Entity_Up : Hb_Entity_Down;
+  entry->reason = up ? Hb_Entity_State_Reason_Up : Hb_Entity_State_Reason_Down;
 }
 
 void fill_adapter_list(Hb_Adapter_Membership_Grp& membership, const client_packet_t* pack) {
@@ -103,21 +103,29 @@ void fill_adapter_list(Hb_Adapter_Membership_Grp& membership, const client_packe
   membership.Hb_num_adapters = static_cast<int32_t>(static_cast<uint32_t>(header.last_index) + 1);
 }
 
+// The first member from node on, or nodes. Few nodes are in most events, so the others are passed many at once.
+int next_member(const Hb_Boolean* list, int node, int nodes) {
+  while (node < nodes && list[node] != Hb_True) {
+    const void* rest = list + node + 1;
+    const void* found = std::memchr(rest, Hb_True, static_cast<size_t>(nodes - node - 1) * sizeof *list);
+    node = found != nullptr ? static_cast<int>((static_cast<const char*>(found) - reinterpret_cast<const char*>(list)) /
+                                               static_cast<ptrdiff_t>(sizeof *list))
+                            : nodes;
+  }
+  return node;
+}
+
 void fill_node_list(Hb_Group& group, const client_packet_t* pack) {
   Hb_Node_Membership_Grp& membership = group.Hb_membership_grp_union.Hb_node_membership_grp;
-  const Message message(pack);
-  const bool up = pack->kind != HB_NODE_DEATH;
-  int32_t count = 0;
-  for (int node = 0; node < global_config_tbl.Hb_max_nodes; ++node) {
-    const auto member = message.at<Hb_Boolean>(static_cast<size_t>(node) * sizeof(Hb_Boolean));
-    if (member == Hb_True) {
-      set_node_state(node, up);
-      ++count;
-    }
-    membership.Hb_node_list[node] = member;
-  }
+  const int nodes = global_config_tbl.Hb_max_nodes;
+  Message(pack).copy(membership.Hb_node_list, 0, static_cast<size_t>(nodes) * sizeof(Hb_Boolean));
   group.Hb_group_type = Hb_Node_Group;
-  membership.Hb_num_nodes = count;
+  membership.Hb_num_nodes = 0;
+  for (int node = next_member(membership.Hb_node_list, 0, nodes); node < nodes;
+       node = next_member(membership.Hb_node_list, node + 1, nodes)) {
+    set_node_state(node, pack->kind != HB_NODE_DEATH);
+    ++membership.Hb_num_nodes;
+  }
 }
 
 // Deaths and joins name members only; a new group says who leads it and whether it is stable.

@@ -1,12 +1,17 @@
 #include "hb_global_data/node_table.h"
 
+#include "hb_global_data/record_index.h"
+
+Record_Index<Hb_Adapter, HB_MAX_ADAPTERS> adapter_index;
+Record_Index<Hb_Node_config_state, HB_MAX_NODES> node_index;
+
 namespace {
 
 bool has_configured_adapter(int node) {
   const auto slots = static_cast<Hb_Adapter_Number>(global_config_tbl.Hb_adapters_per_node);
   const Hb_Adapter_Number first = static_cast<Hb_Adapter_Number>(node) * slots;
   for (Hb_Adapter_Number slot = 0; slot < slots; ++slot) {
-    if (Hash_search(first + slot, global_config_tbl.adap_hash) != nullptr) {
+    if (find_configured_adapter(first + slot) != nullptr) {
       return true;
     }
   }
@@ -33,6 +38,8 @@ void hb_init_global_node_tbl() {
 }
 
 void hb_deinit_global_config_and_node_tbl() {
+  adapter_index.forget();
+  node_index.forget();
   delete[] global_config_tbl.Hb_global_adapter_list;
   global_config_tbl.Hb_global_adapter_list = nullptr;
   delete[] global_config_tbl.node_list;
@@ -44,6 +51,6 @@ void hb_deinit_global_config_and_node_tbl() {
 }
 
 Hb_Adapter* hb_get_adap_entry(Hb_Adapter_Number adap_num) {
-  void* adapter = Hash_search(adap_num, global_config_tbl.adap_hash);
-  return adapter != nullptr ? static_cast<Hb_Adapter*>(adapter) : &HB_INVALID_ADAP;
+  Hb_Adapter* adapter = find_configured_adapter(adap_num);
+  return adapter != nullptr ? adapter : &HB_INVALID_ADAP;
 }

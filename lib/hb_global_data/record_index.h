@@ -1,0 +1,53 @@
+// Configured adapters and nodes by number, without a chain to walk: arrays beside adap_hash and node_hash that lead to
+// the same records. An index belongs to one table; any other table, such as one that is built elsewhere, is searched
+// itself, and so is its own table for a number that the index does not have.
+#pragma once
+
+#include <algorithm>
+#include <array>
+
+#include "hb_global_data/state.h"
+
+template <typename Record, uint32_t Capacity>
+class Record_Index {
+ public:
+  // Starts anew, empty, for numbers below limit of the table.
+  void start(const H_table_str* table, uint32_t limit) {
+    table_ = table;
+    limit_ = std::min(limit, Capacity);
+    std::fill_n(records_.begin(), limit_, nullptr);
+  }
+
+  void add(uint32_t number, Record& record) {
+    if (number < limit_) {
+      records_[number] = &record;
+    }
+  }
+
+  // The table is about to go.
+  void forget() { start(nullptr, 0); }
+
+  // The table's record under the number, or null.
+  Record* find(uint32_t number, H_table_str* table) const {
+    if (number < limit_ && table == table_ && records_[number] != nullptr) {
+      return records_[number];
+    }
+    return static_cast<Record*>(Hash_search(number, table));
+  }
+
+ private:
+  const H_table_str* table_ = nullptr;
+  uint32_t limit_ = 0;
+  std::array<Record*, Capacity> records_{};
+};
+
+extern Record_Index<Hb_Adapter, HB_MAX_ADAPTERS> adapter_index;      // of global_config_tbl.adap_hash
+extern Record_Index<Hb_Node_config_state, HB_MAX_NODES> node_index;  // of global_config_tbl.node_hash
+
+inline Hb_Adapter* find_configured_adapter(Hb_Adapter_Number number) {
+  return adapter_index.find(number, global_config_tbl.adap_hash);
+}
+
+inline Hb_Node_config_state* find_configured_node(uint32_t number) {
+  return node_index.find(number, global_config_tbl.node_hash);
+}
