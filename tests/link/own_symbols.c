@@ -1,4 +1,5 @@
 /* A program with functions of its own that are named like the library's: the library calls its own. */
+#define _GNU_SOURCE
 #include <dlfcn.h>
 #include <stdio.h>
 #include <stdlib.h>
