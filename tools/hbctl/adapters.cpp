@@ -34,10 +34,11 @@ Filter make_filter(const Selection& selection, const Cluster& cluster) {
   }
   for (const std::string& name : selection.networks) {
     const Network* network = find_network(cluster, name);
-    if (network == nullptr)
+    if (network == nullptr) {
       unknown.push_back(fmt::format("network {}", name));
-    else
+    } else {
       filter.networks.insert(network->number);
+    }
   }
   if (!unknown.empty()) throw not_configured(unknown);
   return filter;
@@ -63,7 +64,7 @@ Json network_json(const Network* network) {
 Json adapters_json(const Cluster& cluster, const std::vector<const Adapter*>& adapters, const Liveness& liveness) {
   Json json = json_object("adapters");
   json["adapters"] = Json::array();
-  for (const Adapter* adapter : adapters)
+  for (const Adapter* adapter : adapters) {
     json["adapters"].push_back({{"number", adapter->number},
                                 {"node", or_null(adapter->node)},
                                 {"offset", or_null(adapter->offset)},
@@ -71,6 +72,7 @@ Json adapters_json(const Cluster& cluster, const std::vector<const Adapter*>& ad
                                 {"adapter_type", adapter->type},
                                 {"address", adapter->address},
                                 {"state", state_word(liveness.adapters().state(adapter->number))}});
+  }
   return json;
 }
 
@@ -87,7 +89,7 @@ Table adapters_table(const Cluster& cluster, const std::vector<const Adapter*>& 
                {"TYPE"},
                {"ADDRESS"},
                {"STATE"}});
-  for (const Adapter* adapter : adapters)
+  for (const Adapter* adapter : adapters) {
     table.add({{fmt::format("{}", adapter->number)},
                {number_or_dash(adapter->node)},
                {number_or_dash(adapter->offset)},
@@ -95,6 +97,7 @@ Table adapters_table(const Cluster& cluster, const std::vector<const Adapter*>& 
                {or_dash(adapter->type)},
                {or_dash(adapter->address)},
                state_cell(liveness.adapters().state(adapter->number))});
+  }
   return table;
 }
 

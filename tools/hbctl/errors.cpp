@@ -27,9 +27,10 @@ std::string advice_for_start(int number, const std::string& socket_path) {
   if (number == HB_ECONNECT)
     return fmt::format("start a daemon with: hbd --socket {}\nor name another socket with --socket PATH", socket_path);
   if (number == HB_EDAEMONGONE) return "it may be stopping: look at its log, then try again";
-  if (is_about_published_memory(number))
+  if (is_about_published_memory(number)) {
     return "the daemon answers, but what it publishes in shared memory cannot be used: see that it runs on this "
            "machine, as a user whose segments you may read (ipcs -m), and start it again if they are missing";
+  }
   return "look at the daemon's log, then try again";
 }
 

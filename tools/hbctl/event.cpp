@@ -22,9 +22,10 @@ void read_adapters(Hb_Group& group, Event& event) {
   event.subject = Subject::Adapters;
   Hb_Adapter_Identifier member{};
   Hb_Rc result = hb_get_first_adapter(&group, &member);
-  for (; result == Hb_Success; result = hb_get_next_adapter(&group, &member))
+  for (; result == Hb_Success; result = hb_get_next_adapter(&group, &member)) {
     event.adapters.push_back({member.Hb_adapter_number, hb_adapter_incarnation(&member),
                               hb_has_adapter_died_because_removed(&member) == Hb_True});
+  }
 }
 
 void read_membership(Hb_Group& group, Event& event) {

@@ -24,12 +24,13 @@ std::optional<int> adapters_up(const Network& network, const Liveness& liveness)
 Json networks_json(const Cluster& cluster, const Liveness& liveness) {
   Json json = json_object("networks");
   json["networks"] = Json::array();
-  for (const Network& network : cluster.networks)
+  for (const Network& network : cluster.networks) {
     json["networks"].push_back({{"number", network.number},
                                 {"name", network.name},
                                 {"network_type", network.type},
                                 {"adapters", network.adapters.size()},
                                 {"up", or_null(adapters_up(network, liveness))}});
+  }
   return json;
 }
 

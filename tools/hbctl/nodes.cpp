@@ -50,24 +50,26 @@ std::string reason_text(const NodeRow& row) {
 Json nodes_json(const std::vector<NodeRow>& rows) {
   Json json = json_object("nodes");
   json["nodes"] = Json::array();
-  for (const NodeRow& row : rows)
+  for (const NodeRow& row : rows) {
     json["nodes"].push_back({{"number", row.node.number},
                              {"local", row.local},
                              {"adapters", row.node.adapters},
                              {"state", state_word(row.state)},
                              {"reason", row.reason ? Json(reason_word(*row.reason)) : Json(nullptr)},
                              {"member", or_null(row.member)}});
+  }
   return json;
 }
 
 Table nodes_table(const std::vector<NodeRow>& rows) {
   Table table({{"NODE", Align::Right}, {"LOCAL"}, {"ADAPTERS", Align::Right}, {"STATE"}, {"REASON"}});
-  for (const NodeRow& row : rows)
+  for (const NodeRow& row : rows) {
     table.add({{fmt::format("{}", row.node.number)},
                {row.local ? "yes" : "no"},
                {fmt::format("{}", row.node.adapters)},
                state_cell(row.state),
                {reason_text(row)}});
+  }
   return table;
 }
 

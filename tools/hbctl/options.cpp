@@ -129,9 +129,10 @@ void complete(const CLI::App& app, const Raw& raw, Options& options) {
   options.command = command->get_name();
   if (options.command != "watch") return;
   for (const std::string& word : raw.event_words) options.events |= bits_of_word(word);
-  if (raw.event_words.empty())
+  if (raw.event_words.empty()) {
     options.events =
         HB_EVENT_DEATH | HB_EVENT_JOIN | HB_EVENT_NEW_GROUP | HB_EVENT_DIFF_INSTANCE | HB_EVENT_NODE_HEARTBEAT;
+  }
   if (command->count("--count") != 0) options.count = raw.count;
   if (command->count("--duration") != 0) options.duration = raw.duration;
 }

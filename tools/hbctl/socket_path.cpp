@@ -14,7 +14,7 @@ constexpr const char* kSuffixVariables[] = {"HA_DOMAIN_NAME", "HA_SYSPAR_NAME"};
 
 std::string socket_path_from_environment() {
   const char* base = std::getenv(kPathVariable);
-  const std::string path = base != nullptr ? base : kDefaultPath;
+  std::string path = base != nullptr ? base : kDefaultPath;
   for (const char* variable : kSuffixVariables) {
     const char* suffix = std::getenv(variable);
     if (suffix != nullptr && *suffix != '\0') return path + '.' + suffix;

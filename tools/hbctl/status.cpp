@@ -33,9 +33,10 @@ std::string tally_text(const Tally& tally, size_t configured) {
 
 std::string labelled(const Style& style, const std::vector<std::pair<std::string, Cell>>& rows) {
   std::string text;
-  for (const auto& [label, cell] : rows)
+  for (const auto& [label, cell] : rows) {
     text +=
         style.apply(Paint::Heading, fmt::format("{:<10}", label)) + "  " + style.apply(cell.paint, cell.text) + '\n';
+  }
   return text;
 }
 

@@ -52,9 +52,10 @@ class Planner {
   }
 
   void add_separate_events() {
-    for (const SeparateEvents& separate : kSeparateEvents)
+    for (const SeparateEvents& separate : kSeparateEvents) {
       if ((events_ & separate.events) != 0)
         plan_.subscriptions.push_back({name(separate.suffix), Members::None, {}, {}, HB_NO_NETWORK, separate.events});
+    }
   }
 
   SubscriptionPlan take() { return std::move(plan_); }
@@ -90,10 +91,11 @@ class Planner {
     std::sort(known.begin(), known.end());
     std::vector<Number> result;
     for (Number number : wanted) {
-      if (std::binary_search(known.begin(), known.end(), number))
+      if (std::binary_search(known.begin(), known.end(), number)) {
         result.push_back(number);
-      else
+      } else {
         plan_.unknown.push_back(fmt::format("{} {}", thing, number));
+      }
     }
     return result;
   }

@@ -87,9 +87,10 @@ class Watch {
 
   void follow_configuration() {
     const SubscriptionPlan next = plan();
-    for (const std::string& item : next.unknown)
+    for (const std::string& item : next.unknown) {
       if (std::find(missing_.begin(), missing_.end(), item) == missing_.end())
         warn(item + " is not configured any more; it is followed again when it comes back");
+    }
     missing_ = next.unknown;
     follow(next.subscriptions);
   }

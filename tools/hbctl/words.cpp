@@ -11,27 +11,27 @@ namespace hbctl {
 namespace {
 
 struct EventWord {
-  Hb_Events bits;
   const char* word;
+  Hb_Events bits;
   bool subscribable;
 };
 
 constexpr EventWord kEventWords[] = {
-    {HB_EVENT_NONE, "empty", false},
-    {HB_EVENT_DEATH, "death", true},
-    {HB_EVENT_JOIN, "join", true},
-    {HB_EVENT_NEW_GROUP, "new-group", true},
-    {HB_EVENT_FFDC_ID, "failure-data", false},
-    {HB_EVENT_SITES, "sites", true},
-    {HB_EVENT_SITE_SPLIT, "site-split", false},
-    {HB_EVENT_SITE_MERGE, "site-merge", false},
-    {HB_EVENT_CONFIGURATION, "configuration", false},
-    {HB_EVENT_DIFF_INSTANCE, "different-instance", true},
-    {HB_EVENT_NODE_HEARTBEAT, "heartbeat", true},
-    {HB_EVENT_SPLIT_MERGE, "split-merge", true},
-    {HB_EVENT_SUBCLUSTER_SPLIT, "subcluster-split", false},
-    {HB_EVENT_SUBCLUSTER_MERGE, "subcluster-merge", false},
-    {HB_EVENT_ALIAS, "alias", false},
+    {"empty", HB_EVENT_NONE, false},
+    {"death", HB_EVENT_DEATH, true},
+    {"join", HB_EVENT_JOIN, true},
+    {"new-group", HB_EVENT_NEW_GROUP, true},
+    {"failure-data", HB_EVENT_FFDC_ID, false},
+    {"sites", HB_EVENT_SITES, true},
+    {"site-split", HB_EVENT_SITE_SPLIT, false},
+    {"site-merge", HB_EVENT_SITE_MERGE, false},
+    {"configuration", HB_EVENT_CONFIGURATION, false},
+    {"different-instance", HB_EVENT_DIFF_INSTANCE, true},
+    {"heartbeat", HB_EVENT_NODE_HEARTBEAT, true},
+    {"split-merge", HB_EVENT_SPLIT_MERGE, true},
+    {"subcluster-split", HB_EVENT_SUBCLUSTER_SPLIT, false},
+    {"subcluster-merge", HB_EVENT_SUBCLUSTER_MERGE, false},
+    {"alias", HB_EVENT_ALIAS, false},
 };
 
 constexpr const char* kReasonWords[] = {
