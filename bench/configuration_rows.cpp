@@ -1,4 +1,6 @@
 // Loading the configuration of the largest cluster, at the start and on an update.
+#include <malloc.h>
+
 #include <cstring>
 #include <memory>
 #include <semaphore>
@@ -39,9 +41,11 @@ class Answer {
   std::jthread thread_;
 };
 
-// Ends the one that was, and stands ready for the next.
+// Ends the one that was, and stands ready for the next. What was released goes back to the system, so that each load
+// starts with the memory of a new process.
 void answer_next(std::unique_ptr<Answer>& answer, const Peer& peer) {
   answer.reset();
+  malloc_trim(0);
   answer = std::make_unique<Answer>(peer);
 }
 
