@@ -2,6 +2,7 @@
 
 #include <array>
 #include <charconv>
+#include <cmath>
 #include <utility>
 
 namespace hbd {
@@ -33,7 +34,7 @@ std::optional<std::chrono::microseconds> parse_duration(std::string_view text) {
   if (!unit || !(length >= 0 && length <= a_year)) {
     return std::nullopt;
   }
-  return std::chrono::microseconds(static_cast<long long>(length + 0.5));
+  return std::chrono::microseconds(std::llround(length));
 }
 
 }  // namespace hbd

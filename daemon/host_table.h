@@ -5,11 +5,11 @@
 #include <libmnl/libmnl.h>
 
 #include <array>
-#include <compare>
 #include <cstdint>
 #include <map>
 #include <set>
 #include <string>
+#include <tuple>
 
 #include "hb_client/types.h"
 
@@ -27,7 +27,9 @@ struct HostAddress {
   int interface = 0;
   std::array<std::uint8_t, 16> bytes{}; /**< as in `Hb_IP_address6` */
 
-  auto operator<=>(const HostAddress&) const = default;
+  bool operator<(const HostAddress& other) const {
+    return std::tie(interface, bytes) < std::tie(other.interface, other.bytes);
+  }
 };
 
 /** What the kernel has told about links and addresses. */

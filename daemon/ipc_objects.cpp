@@ -7,6 +7,7 @@
 
 #include <array>
 #include <cerrno>
+#include <cstdint>
 #include <cstring>
 #include <string_view>
 
@@ -45,7 +46,7 @@ SharedSegment::SharedSegment(key_t key, std::size_t size, int mode)
     fail_to_make("shared segment", key, size);
   }
   data_ = shmat(id_, nullptr, 0);
-  if (data_ == reinterpret_cast<void*>(-1)) {
+  if (reinterpret_cast<std::intptr_t>(data_) == -1) {
     const int reason = errno;
     shmctl(id_, IPC_RMID, nullptr);
     errno = reason;
