@@ -82,9 +82,9 @@ TEST_F(ConfigurationLoad, TheSiteNumbersAreNotTouched) {
 // ---- Adapters ----
 
 TEST_F(ConfigurationLoad, TheListHoldsTheRecordsInTheirOrder) {
-  std::vector<uint32_t> numbers;
-  for (int index = 0; index < 5; ++index) {
-    numbers.push_back(global_config_tbl.Hb_global_adapter_list[index].Hb_adapter_num);
+  std::vector<uint32_t> numbers(5);
+  for (size_t index = 0; index < 5; ++index) {
+    numbers[index] = global_config_tbl.Hb_global_adapter_list[index].Hb_adapter_num;
   }
   EXPECT_THAT(numbers, ElementsAre(13, 0, 12, 17, 2));
 }

@@ -153,7 +153,7 @@ TEST_F(ConfigurationQueries, TheAdaptersOfANetworkOutOfRangeOrUnusedAreNotWalked
 }
 
 TEST_F(ConfigurationQueries, ANetworkInUseWithoutAdaptersEndsAtOnce) {
-  std::strcpy(global_config_tbl.Hb_global_network_list[2].Hb_network_name, "net_idle");
+  set_text(global_config_tbl.Hb_global_network_list[2].Hb_network_name, "net_idle");
   Hb_Adapter_Number adapter = 99;
   Hb_Cursor cursor = 55;
   EXPECT_TRUE(fails_with(1, [&] { return hb_get_first_configured_adapter_in_network(2, &adapter, &cursor); }));
@@ -237,6 +237,25 @@ TEST_F(ConfigurationQueries, ASlotOfANodeBeyond48IsAnAdapterLikeAnyOther) {
   Hb_Node_Number node = 99;
   EXPECT_TRUE(succeeds([&] { return hb_get_node_number_by_adapter_number(60, &node); }));
   EXPECT_EQ(1, node);
+}
+
+TEST_F(ConfigurationQueries, ASlotBeyondTheNumberOfNetworksCountsWhenItHoldsAName) {
+  reload(ConfigurationMessage().max_nodes(1).adapters_per_node(5).adapter(0, "10.0.0.1", 3).network("only"));
+  set_text(global_config_tbl.Hb_global_network_list[3].Hb_network_name, "net_left");
+  Hb_Network_Number network = 99;
+  Hb_Cursor cursor = 2;
+  EXPECT_TRUE(succeeds([&] { return hb_get_next_configured_network_number(&network, &cursor); }));
+  EXPECT_EQ(3, network);
+  network = 99;
+  char name[] = "net_left";
+  EXPECT_TRUE(succeeds([&] { return hb_get_network_number_by_name(name, &network); }));
+  EXPECT_EQ(3, network);
+  Hb_Adapter_Number adapter = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_first_configured_adapter_in_network(3, &adapter, &cursor); }));
+  EXPECT_EQ(0U, adapter);
+  int networks = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_number_of_configured_networks(&networks); }));
+  EXPECT_EQ(1, networks);
 }
 
 TEST_F(ConfigurationQueries, FewerNetworksThanAdaptersPerNodeLeaveUnusedSlots) {

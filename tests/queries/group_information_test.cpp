@@ -31,7 +31,7 @@ TEST_F(Membership, TheFailureDataIdentifierComesWithAllItsBytes) {
 TEST_F(Membership, NoFailureDataIdentifierIsToldOfAnotherEvent) {
   for (const Hb_Events events : {0, 3, 4, 9, 128, 256, 512}) {
     make_adapter_group(events);
-    std::strcpy(group->Hb_ffdc_id, "identifier");
+    set_text(group->Hb_ffdc_id, "identifier");
     Hb_FFDC_Id identifier = "before";
     EXPECT_TRUE(fails_with(3, [&] { return hb_get_FFDC_id(group.get(), &identifier); })) << events;
     EXPECT_STREQ("before", identifier);

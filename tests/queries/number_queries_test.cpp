@@ -211,7 +211,7 @@ TEST_F(ConfigurationQueries, AnUnknownOrEmptyNameIsNoNetwork) {
 }
 
 TEST_F(ConfigurationQueries, OfTwoNetworksWithOneNameTheFirstIsFound) {
-  std::strcpy(global_config_tbl.Hb_global_network_list[0].Hb_network_name, "net_disk_01");
+  set_text(global_config_tbl.Hb_global_network_list[0].Hb_network_name, "net_disk_01");
   Hb_Network_Number network = 99;
   char name[] = "net_disk_01";
   EXPECT_TRUE(succeeds([&] { return hb_get_network_number_by_name(name, &network); }));
@@ -265,7 +265,7 @@ TEST_F(ConfigurationQueries, AnUnusedSlotHasATypeButNoName) {
 }
 
 TEST_F(ConfigurationQueries, AnUnusedSlotTellsTheTypeThatItHolds) {
-  std::strcpy(global_config_tbl.Hb_global_network_list[2].Hb_network_type, "stored");
+  set_text(global_config_tbl.Hb_global_network_list[2].Hb_network_type, "stored");
   char type[16] = "before";
   EXPECT_TRUE(succeeds([&] { return hb_get_network_type_by_number(2, type); }));
   EXPECT_STREQ("stored", type);

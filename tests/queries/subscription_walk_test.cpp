@@ -109,6 +109,44 @@ TEST_F(Subscription, MembersAtTheBoundOfTheClusterAreNotWalked) {
   EXPECT_TRUE(fails_with(1, [&] { return hb_get_first_subscription_site(&sites, &site); }));
 }
 
+std::vector<size_t> walked_adapters(Hb_Subscription_Group& group) {
+  std::vector<size_t> walked;
+  Hb_Adapter_Number adapter = 0;
+  for (Hb_Rc rc = hb_get_first_subscription_adapter(&group, &adapter); rc == Hb_Success;
+       rc = hb_get_next_subscription_adapter(&group, &adapter)) {
+    walked.push_back(adapter);
+  }
+  return walked;
+}
+
+TEST_F(Subscription, MembersFarApartAreWalkedWhereverTheyLieInTheirBytes) {
+  reload(ConfigurationMessage().max_nodes(2049).adapters_per_node(48));
+  const std::vector<size_t> members = {0,    7,    8,    63,    64,    65,    127,   128,   191,  1000,
+                                       1001, 4095, 4096, 50000, 98288, 98343, 98344, 98350, 98351};
+  Hb_Subscription_Group group = group_of_type(2);
+  for (const size_t member : members) set_member(group, member);
+  EXPECT_EQ(members, walked_adapters(group));
+}
+
+TEST_F(Subscription, TheOnlyMemberOfALargeSetIsFoundAtEachPlace) {
+  reload(ConfigurationMessage().max_nodes(2049).adapters_per_node(48));
+  for (size_t member = 0; member < 98352; member += member < 300 || member > 98000 ? 1 : 1009) {
+    Hb_Subscription_Group group = group_of_type(2);
+    set_member(group, member);
+    ASSERT_THAT(walked_adapters(group), ElementsAre(member));
+  }
+}
+
+TEST_F(Subscription, ABoundInsideAByteEndsTheWalk) {
+  for (const int32_t bound : {1, 63, 64, 65, 100, 127, 129}) {
+    reload(ConfigurationMessage().max_nodes(1).adapters_per_node(bound));
+    Hb_Subscription_Group group = group_of_type(2);
+    set_member(group, static_cast<size_t>(bound) - 1);
+    for (size_t beyond = static_cast<size_t>(bound); beyond < 300; ++beyond) set_member(group, beyond);
+    EXPECT_THAT(walked_adapters(group), ElementsAre(static_cast<size_t>(bound) - 1)) << bound;
+  }
+}
+
 TEST_F(Subscription, MembersAreWalkedWithoutAskingTheConfiguration) {
   Hb_Subscription_Group group = group_of_type(2);
   set_member(group, 1);

@@ -3,6 +3,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <string>
 #include <vector>
 
@@ -25,6 +26,12 @@ ConfigurationMessage sparse_cluster();
 
 // An address as the queries take it.
 Hb_IP_address6 address_of(const std::string& text);
+
+// Writes a text with its terminator into the front of a field.
+template <size_t N>
+void set_text(char (&field)[N], const char* text) {
+  std::memcpy(field, text, std::strlen(text) + 1);
+}
 
 // The bytes in a new array, as the library holds a packet.
 Packet packet_of(const Bytes& bytes);

@@ -2,6 +2,8 @@
 #include <gmock/gmock.h>
 #include <unistd.h>
 
+#include <cstring>
+
 #include "VEX_EVMONEventPipeHandler.h"
 #include "event_outputs.h"
 #include "hb_global_data/vex_event_queue.h"
@@ -22,7 +24,7 @@ class Scripted_Pipe_Handler : public EVMONEventPipeHandler {
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override {
     ++calls;
     *events = 64;
-    std::strcpy(name, "from the queue");
+    std::memcpy(name, "from the queue", 15);
     group->Hb_group_type = Hb_Site_Group;
     *seqnum_p = 3;
     return result;
