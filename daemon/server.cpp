@@ -20,6 +20,11 @@ constexpr std::chrono::seconds patience{5};
 
 Descriptor spare_descriptor() { return Descriptor(open("/dev/null", O_RDONLY | O_CLOEXEC)); }
 
+/* What the client's library takes no subscription to goes to whoever has asked for the configuration. */
+bool concerns_every_client(const Event& event) {
+  return std::holds_alternative<ConfigurationEvent>(event.body) || std::holds_alternative<FailureData>(event.body);
+}
+
 std::string label_of(unsigned long number, int socket) {
   ucred peer{};
   socklen_t size = sizeof(peer);
@@ -49,15 +54,17 @@ void Server::deliver(const Event& event, const Cluster& cluster) {
     }
     return frame;
   };
-  const bool by_client = std::holds_alternative<ConfigurationEvent>(event.body);
+  const bool by_client = concerns_every_client(event);
   for (const auto& client : clients_) {
-    if (by_client && client->follows_configuration) {
-      client->send(bytes());
-    }
+    bool told = false;
     for (const auto& subscription : client->subscriptions) {
       if (subscription.wants(event, cluster)) {
         client->send(bytes(), subscription.name);
+        told = true;
       }
+    }
+    if (by_client && !told && client->follows_configuration) {
+      client->send(bytes());
     }
   }
 }

@@ -306,6 +306,22 @@ TEST(FailureData, goes_to_a_mask_with_its_bit_and_carries_the_identifier_in_the_
   EXPECT_EQ(daemon.follow(SubscriptionType::AllAdapters, 8).at(0), expected.bytes());
 }
 
+TEST(FailureData, goes_once_and_without_a_name_to_a_client_that_asked_for_the_configuration) {
+  ScriptedDaemon daemon("[[event]]\nat = \"1s\"\nkind = \"ffdc-id\"\nid = \"x\"\n", 2);
+  Connection client(daemon.socket());
+  ASSERT_TRUE(client.configuration());
+  client.subscribe(SubscriptionType::AllAdapters, death, "a");
+  client.subscribe(SubscriptionType::AllNodes, death, "n");
+  ExpectedPacket expected;
+  expected.kind = 12;
+  expected.ffdc_id = "x";
+  expected.sequence = 2;
+  EXPECT_EQ(client.receive(), expected.bytes());
+  expected.ffdc_id = "end";
+  expected.sequence = 3;
+  EXPECT_EQ(client.receive(), expected.bytes());
+}
+
 TEST(DifferentInstance, carries_the_senders_address_and_instance_in_20_bytes) {
   ScriptedDaemon daemon(
       "[[event]]\nat = \"1s\"\nkind = \"different-instance\"\naddress = \"192.0.2.99\"\ninstance = 4026531841\n");
