@@ -59,11 +59,8 @@ StopSignal::StopSignal() : descriptor_(::eventfd(0, EFD_CLOEXEC)) {
 
 StopSignal::~StopSignal() { ::close(descriptor_); }
 
-void StopSignal::raise() {
-  if (::eventfd_write(descriptor_, 1) != 0) {
-    throw_errno("eventfd_write");
-  }
-}
+// An event counter that was made takes a first event.
+void StopSignal::raise() noexcept { ::eventfd_write(descriptor_, 1); }
 
 DaemonConnection::DaemonConnection(DaemonConnection&& other) noexcept
     : descriptor_(std::exchange(other.descriptor_, -1)), stop_(std::move(other.stop_)) {}
@@ -304,7 +301,7 @@ void FakeDaemon::stop_listening() { ::shutdown(listener_, SHUT_RDWR); }
 
 void FakeDaemon::write_segment(Segment segment, size_t offset, std::string_view bytes) {
   void* memory = ::shmat(segment_id(segment), nullptr, 0);
-  if (memory == reinterpret_cast<void*>(-1)) {
+  if (reinterpret_cast<intptr_t>(memory) == -1) {
     throw_errno("shmat");
   }
   std::memcpy(static_cast<char*>(memory) + offset, bytes.data(), bytes.size());
@@ -314,7 +311,7 @@ void FakeDaemon::write_segment(Segment segment, size_t offset, std::string_view 
 Bytes FakeDaemon::read_segment(Segment segment) {
   shmid_ds state{};
   void* memory = ::shmat(segment_id(segment), nullptr, SHM_RDONLY);
-  if (memory == reinterpret_cast<void*>(-1) || ::shmctl(segment_id(segment), IPC_STAT, &state) != 0) {
+  if (reinterpret_cast<intptr_t>(memory) == -1 || ::shmctl(segment_id(segment), IPC_STAT, &state) != 0) {
     throw_errno("shmat");
   }
   Bytes bytes(static_cast<const char*>(memory), state.shm_segsz);

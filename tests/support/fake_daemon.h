@@ -25,7 +25,7 @@ class StopSignal {
   StopSignal(const StopSignal&) = delete;
   StopSignal& operator=(const StopSignal&) = delete;
 
-  void raise();
+  void raise() noexcept;
   // Readable from then on.
   int descriptor() const { return descriptor_; }
 

@@ -12,6 +12,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <bit>
 #include <cerrno>
 
 namespace hb_test {
@@ -87,7 +88,7 @@ Outcome turn(const char* function, Describe describe) {
 template <typename Result>
 Result as(long value) {
   if constexpr (std::is_pointer_v<Result>) {
-    return reinterpret_cast<Result>(value);
+    return std::bit_cast<Result>(value);
   } else {
     return static_cast<Result>(value);
   }
