@@ -59,8 +59,9 @@ bool BareTable::insert(const Hb_IP_address6& address, void* item) {
   uint32_t words[4];
   std::memcpy(words, &address, sizeof words);
   BareEntry* previous = nullptr;
-  BareEntry** link = place(&buckets_[(words[0] + words[1] + words[2] + words[3]) % size_], &previous,
-                           [&](const BareEntry& entry) { return std::memcmp(&entry.key, words, sizeof words) == 0; });
+  BareEntry** link =
+      place(&buckets_[(words[0] + words[1] + words[2] + words[3]) % size_], &previous,
+            [&](const BareEntry& entry) { return std::memcmp(entry.key.address, words, sizeof words) == 0; });
   if (*link != nullptr) return false;
   *link = new BareEntry{{.address = {words[0], words[1], words[2], words[3]}}, item, nullptr, previous, 3};
   return true;

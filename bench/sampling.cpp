@@ -43,7 +43,7 @@ Samples ratio_of_each_round(const Samples& ours, const Samples& floor) {
 }  // namespace
 
 double quantile(Samples samples, double fraction) {
-  const auto position = static_cast<ptrdiff_t>(fraction * static_cast<double>(samples.size() - 1) + 0.5);
+  const auto position = static_cast<ptrdiff_t>(std::lround(fraction * static_cast<double>(samples.size() - 1)));
   std::nth_element(samples.begin(), samples.begin() + position, samples.end());
   return samples[static_cast<size_t>(position)];
 }

@@ -7,6 +7,7 @@
 
 #include <array>
 #include <csignal>
+#include <cstdint>
 
 #include "descriptor.h"
 #include "hb_protocol/shared_memory.h"
@@ -44,7 +45,7 @@ void Segments::publish(const std::string& socket_path, const Cluster& cluster) {
   make_segment(socket_path, HB_SECURITY_SEGMENT_ID, sizeof(security_information));
   make_semaphores(socket_path);
   void* attached = shmat(first, nullptr, 0);
-  if (attached == reinterpret_cast<void*>(-1)) throw_errno("shmat");
+  if (reinterpret_cast<intptr_t>(attached) == -1) throw_errno("shmat");
   *static_cast<memory_configuration_data*>(attached) = {1, nodes, static_cast<uint32_t>(cluster.adapters())};
   shmdt(attached);
 }

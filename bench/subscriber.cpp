@@ -24,7 +24,7 @@ Bytes subscription_request(Hb_Events events) {
   Hb_Subscription_Group group{};
   group.Hb_subscription_type = Hb_All_Adapters_Subscription;
   group.Hb_events = events;
-  std::strcpy(group.Hb_name, "benchmark");
+  std::memcpy(group.Hb_name, "benchmark", sizeof "benchmark");
   Bytes request(HB_REQUEST_HEADER_SIZE + sizeof group);
   put(request, offsetof(packet_str, kind), static_cast<int32_t>(HB_SUBSCRIBE));
   put(request, offsetof(packet_str, len), static_cast<int32_t>(sizeof group));
