@@ -1,6 +1,7 @@
 #include "Hb_Csock_Base.h"
 
 namespace {
+// Level of the interface that this source implements; nothing reads it.
 [[maybe_unused]] constexpr int Hb_CsockMajorVersion = 1;
 [[maybe_unused]] constexpr int Hb_CsockMinorVersion = 0;
 }  // namespace

@@ -34,14 +34,6 @@ void trace_values(Trace_Category category, Trace_Record record, Values... values
   }
 }
 
-template <typename... Texts>
-void trace_strings(Trace_Category category, Trace_Record record, Texts... texts) {
-  if (trace_is_on(category)) {
-    tr_ms_record_strings_1(hbc_trace_component, record, pTokens[category], static_cast<uint32_t>(sizeof...(texts)),
-                           static_cast<const char*>(texts)...);
-  }
-}
-
 // One data block of a record.
 struct Trace_Block {
   const void* bytes;

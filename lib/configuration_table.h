@@ -4,7 +4,6 @@
 #include "hash.h"
 #include "hb_client/configuration.h"
 
-// Field order is fixed: tests and debuggers of other programs read the table as it lies in memory.
 struct Hb_Configuration_Internal {
   Hb_Node_Number local_node_number;
   int Hb_max_nodes;

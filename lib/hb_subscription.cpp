@@ -177,11 +177,11 @@ constexpr int next = 0;
 constexpr int add_member = 1;
 constexpr int remove_member = 0;
 
-// Copies what a name slot keeps of a name.
+// Copies what a name slot keeps of a name, the rest zero. The name may lie in the slot itself.
 void copy_name(Hb_Name& to, const char* name) {
-  const size_t length = strnlen(name, sizeof to - 1);
-  std::memcpy(to, name, length);
-  to[length] = '\0';
+  Hb_Name kept = {};
+  std::memcpy(kept, name, strnlen(name, sizeof kept - 1));
+  std::memcpy(to, kept, sizeof to);
 }
 
 // What the record is sent as, and what its type is afterwards.
@@ -301,7 +301,7 @@ Hb_Rc hb_add_all_nodes_to_subscription_group(Hb_Subscription_Group* group) {
   }
   reset(group, node_worker);
   Member_Set members(group);
-  for (int node = 0; node < table().Hb_max_nodes; ++node) {
+  for (int node = 0; node < std::min<int>(table().Hb_max_nodes, HB_MAX_NODES); ++node) {
     if (global_node_tbl[node] == Hb_True) {
       members.change(static_cast<uint32_t>(node), true);
     }
@@ -385,7 +385,6 @@ Hb_Rc hb_subscribe(char* name, Hb_Subscription_Group* group, int events) {
     return fail(HB_ESUBSCRIBE);
   }
   copy_name(group->Hb_name, name);
-  group->Hb_name[sizeof group->Hb_name - 1] = '\0';
   group->Hb_events = events;
   const Hb_Rc rc = VEX_handle_subscription(name, group);
   group->Hb_subscription_type = type.left;

@@ -5,7 +5,10 @@
 #include <memory>
 #include <new>
 
+#include "hash_removals.h"
 #include "utils.h"
+
+uint32_t hash_removals = 0;
 
 namespace {
 
@@ -95,6 +98,7 @@ void* insert(const Key& key, H_table_str* table, void* newitem) {
   if (last != nullptr && location > 0) {
     void* previous = last->pointer;
     last->pointer = newitem;
+    ++hash_removals;
     return previous;
   }
   void* block = nullptr;
@@ -129,6 +133,7 @@ void* remove(const Key& key, H_table_str* table) {
     void* item = entry->pointer;
     ccst_free(entry);
     --table->entries;
+    ++hash_removals;
     return item;
   }
   return nullptr;
@@ -235,6 +240,7 @@ void Hash_free(H_table_str* table) {
     return;
   }
   for_each_entry(table, [](int32_t, H_obj_str* entry) { ccst_free(entry); });
+  ++hash_removals;
   ccst_free(table->name);
   ccst_free(table->table);
   ccst_free(table);
@@ -247,6 +253,7 @@ void Hash_clean(H_table_str* table) {
   for_each_entry(table, [](int32_t, H_obj_str* entry) { ccst_free(entry); });
   std::memset(table->table, 0, static_cast<size_t>(table->size) * bucket_size);
   table->entries = 0;
+  ++hash_removals;
 }
 
 int Hash_entries(H_table_str* table) { return table != nullptr ? table->entries : 0; }

@@ -1,7 +1,10 @@
 #include "utils.h"
 
+#include <climits>
 #include <cstdio>
 #include <cstring>
+#include <new>
+#include <string_view>
 
 int memchunks = 0;
 char RUNDIR[256] = {};
@@ -30,6 +33,9 @@ void my_free(void* ptr) { ccst_free(ptr); }
 namespace {
 
 char* allocate(size_t size, const char* tag) {
+  if (size > INT_MAX) {
+    throw std::bad_alloc();
+  }
   void* block = nullptr;
   cpp_malloc(&block, static_cast<int>(size), tag);
   return static_cast<char*>(block);

@@ -13,7 +13,7 @@ enum Hb_Event_Bits {
   HB_EVENT_DEATH = 1,               /**< adapters or nodes left the group */
   HB_EVENT_JOIN = 2,                /**< adapters or nodes joined it */
   HB_EVENT_NEW_GROUP = 4,           /**< a complete group, with leader and status */
-  HB_EVENT_FFDC_ID = 8,             /**< a failure-data identifier */
+  HB_EVENT_FFDC_ID = 8,             /**< a failure-data identifier; not subscribed to */
   HB_EVENT_SITE_SPLIT = 32,         /**< a site was separated */
   HB_EVENT_SITE_MERGE = 64,         /**< a site came back */
   HB_EVENT_SITES = 0x60,            /**< both site events; subscribes to all sites */
@@ -56,7 +56,8 @@ HB_API Hb_Rc hb_get_event_message(int* descriptors, struct timeval* timeout, Hb_
  * @param descriptor receives a new array that ends with -1, to be given back with hb_free_file_descriptor_array().
  * @param numbers_of_fds receives how many descriptors stand before the -1: 1 in daemon mode.
  * @return `Hb_Success`, or `Hb_Failure` when hb_init() fails (its error number stands) or `descriptor` or
- * `numbers_of_fds` is null (no error number), or with `HB_ENOMEM`.
+ * `numbers_of_fds` is null (no error number), or with `HB_ENOMEM`, or
+ * with `HB_ECOMM` when the connection was dropped.
  */
 HB_API Hb_Rc hb_get_file_descriptor_array(int** descriptor, int* numbers_of_fds);
 

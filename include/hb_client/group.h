@@ -149,7 +149,7 @@ HB_STATIC_ASSERT(offsetof(Hb_Node_Membership_Grp, Hb_node_list) == 4, "node list
 HB_STATIC_ASSERT(sizeof(Hb_Group) == 393480, "groups are 393,480 bytes");
 
 /*
- * Every accessor below that fails with an error number also fails with `HB_EINVAL` when a pointer is null. Those that
+ * Every accessor below also fails with `HB_EINVAL` when a pointer is null, where it is not said otherwise. Those that
  * start the client first fail as hb_init() does when that fails; the others work on the record alone.
  */
 
@@ -232,7 +232,8 @@ HB_API Hb_Boolean hb_has_adapter_died_because_removed(Hb_Adapter_Identifier* id)
 HB_API Hb_Incarnation hb_adapter_incarnation(Hb_Adapter_Identifier* id);
 
 /**
- * The failure-data identifier of a death, a join or a failure-data event: 43 bytes.
+ * The failure-data identifier of a death, a join or a failure-data event: 43 bytes as the daemon sent them. They need
+ * not hold a terminator: print at most 43 characters.
  *
  * @return `Hb_Success`, or `Hb_Failure` with `HB_EWRONGSTATE` (another event, or none stored). Starts the client.
  */
@@ -260,7 +261,10 @@ HB_API Hb_Rc hb_get_split_info(Hb_Group* group, Hb_Split_Merge_Info* p_split_inf
 /** The same function as hb_get_split_info(). */
 HB_API Hb_Rc hb_get_merge_info(Hb_Group* group, Hb_Split_Merge_Info* p_split_info);
 
-/** Releases the node numbers of both sides and nulls their pointers; a second call does nothing. */
+/**
+ * Releases the node numbers of both sides and nulls their pointers; a second call does nothing. Only for the record of
+ * a split or merge event: in a copy from another kind of group the pointers are other bytes.
+ */
 HB_API void hb_free_split_info(Hb_Split_Merge_Info* p_split_info);
 /** The same function as hb_free_split_info(). */
 HB_API void hb_free_merge_info(Hb_Split_Merge_Info* p_split_info);

@@ -9,7 +9,8 @@ HB_BEGIN_DECLS
 /**
  * The mode: `Hb_False`, the value at program start, for the daemon, anything else for VEX mode.
  *
- * Set it before hb_init(). hb_terminate() sets it back to `Hb_False`.
+ * Set it before hb_init(). hb_terminate() sets it back to `Hb_False` after a start that succeeded; after one that
+ * failed, set it back yourself.
  */
 extern HB_API Hb_Boolean IsVEX;
 

@@ -137,6 +137,9 @@ Hb_Rc send_data(Hb_Client_Request kind, const void* data, int data_length) {
 Hb_Rc hb_init_communication() {
   client_pid = getpid();
   if (!resolve_socket_path()) {
+    // What an earlier start that failed left open is forgotten here as it is by a connection.
+    client_socket = nullptr;
+    client_select = nullptr;
     return fail(HB_ECONNECT);
   }
   client_socket = new (std::nothrow) Hb_Csock;

@@ -95,9 +95,10 @@ void fill_adapter_list(Hb_Adapter_Membership_Grp& membership, const client_packe
   for (size_t offset = sizeof header; offset + sizeof(hb_adapter_event_entry) <= end;
        offset += sizeof(hb_adapter_event_entry)) {
     const auto entry = message.at<hb_adapter_event_entry>(offset);
-    if (entry.adapter < HB_MAX_ADAPTERS) {
-      membership.Hb_adapter_list[entry.adapter] = entry.incarnation;
+    if (entry.adapter >= HB_MAX_ADAPTERS) {
+      continue;  // the list has no place for it
     }
+    membership.Hb_adapter_list[entry.adapter] = entry.incarnation;
     set_adapter_state(entry.adapter, state);
   }
   membership.Hb_num_adapters = static_cast<int32_t>(static_cast<uint32_t>(header.last_index) + 1);

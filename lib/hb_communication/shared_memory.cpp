@@ -83,6 +83,11 @@ bool is_attached(const void* address) { return address != nullptr && reinterpret
 template <typename Segment, size_t N>
 Hb_Rc attach(key_t key, size_t size, const Errno_Mapping (&get_errors)[N], int& id, Segment*& segment) {
   id = shmget(key, size, 0);
+  if (size == 0) {
+    // Systems differ in whether they refuse this for a segment that exists; nothing of no size can be read.
+    id = -1;
+    errno = EINVAL;
+  }
   if (id == -1) {
     return fail_by_errno(get_errors, HB_ESHMGET);
   }
@@ -95,8 +100,7 @@ Hb_Rc attach(key_t key, size_t size, const Errno_Mapping (&get_errors)[N], int& 
   return Hb_Success;
 }
 
-template <typename Segment>
-void detach(Segment*& segment) {
+void detach(const void* segment) {
   if (is_attached(segment)) {
     shmdt(segment);
   }

@@ -1,11 +1,12 @@
 // Configured adapters and nodes by number, without a chain to walk: arrays beside adap_hash and node_hash that lead to
-// the same records. An index belongs to one table; any other table, such as one that is built elsewhere, is searched
-// itself, and so is its own table for a number that the index does not have.
+// the same records. An index answers for one table, and only while no entry of any table was replaced or removed;
+// otherwise, and for a number that the index does not have, the table itself is searched.
 #pragma once
 
 #include <algorithm>
 #include <array>
 
+#include "hash_removals.h"
 #include "hb_global_data/state.h"
 
 template <typename Record, uint32_t Capacity>
@@ -14,6 +15,7 @@ class Record_Index {
   // Starts anew, empty, for numbers below limit of the table.
   void start(const H_table_str* table, uint32_t limit) {
     table_ = table;
+    removals_ = hash_removals;
     limit_ = std::min(limit, Capacity);
     std::fill_n(records_.begin(), limit_, nullptr);
   }
@@ -29,7 +31,7 @@ class Record_Index {
 
   // The table's record under the number, or null.
   Record* find(uint32_t number, H_table_str* table) const {
-    if (number < limit_ && table == table_ && records_[number] != nullptr) {
+    if (number < limit_ && table == table_ && removals_ == hash_removals && records_[number] != nullptr) {
       return records_[number];
     }
     return static_cast<Record*>(Hash_search(number, table));
@@ -37,6 +39,7 @@ class Record_Index {
 
  private:
   const H_table_str* table_ = nullptr;
+  uint32_t removals_ = 0;
   uint32_t limit_ = 0;
   std::array<Record*, Capacity> records_{};
 };

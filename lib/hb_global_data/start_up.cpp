@@ -28,7 +28,7 @@ void clear_subscription_names() {
   std::memset(networkEventSubscriptionName, 0, sizeof networkEventSubscriptionName - 1);
 }
 
-// What a table still held is forgotten: a start that failed after loading leaves it to nobody. Nodes stay as they are.
+// Whatever these still held is forgotten, not released; the nodes stay as they are until the table is loaded.
 void forget_adapter_tables() {
   global_config_tbl.Hb_global_adapter_list = nullptr;
   global_config_tbl.adap_hash = nullptr;

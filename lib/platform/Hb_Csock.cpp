@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <cstdio>
 #include <cstring>
+#include <memory>
 #include <new>
 
 #include "hb_communication/connection.h"
@@ -20,6 +21,7 @@
 
 namespace {
 
+// Level of the interface that this source implements; nothing reads it.
 [[maybe_unused]] constexpr int Hb_CsockMajorVersion = 1;
 [[maybe_unused]] constexpr int Hb_CsockMinorVersion = 0;
 
@@ -192,16 +194,16 @@ Hb_Rc Hb_Csock::receive(char** recvptr, int& len) {
   if (recvn(reinterpret_cast<char*>(&length), sizeof length) != Hb_Success) {
     return Hb_Failure;
   }
-  char* message = length >= 0 ? new (std::nothrow) char[static_cast<size_t>(length)] : nullptr;
+  std::unique_ptr<char[]> message(length >= 0 ? new (std::nothrow) char[static_cast<size_t>(length)] : nullptr);
   if (message == nullptr) {
     myError = Hb_Csock_RECV_FAILURE;
     return Hb_Failure;
   }
-  *recvptr = message;
-  if (recvn(message, length) != Hb_Success) {
-    delete[] message;  // the caller's pointer keeps the address, which it must not use after a failure
+  *recvptr = message.get();  // kept by the caller after a failure too, when it must not be used
+  if (recvn(message.get(), length) != Hb_Success) {
     return Hb_Failure;
   }
+  message.release();
   len = length;
   return Hb_Success;
 }

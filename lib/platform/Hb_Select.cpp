@@ -4,6 +4,7 @@
 
 namespace {
 
+// Level of the interface that this source implements; nothing reads it.
 [[maybe_unused]] constexpr int Hb_SelectMajorVersion = 1;
 [[maybe_unused]] constexpr int Hb_SelectMinorVersion = 0;
 
