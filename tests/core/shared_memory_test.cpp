@@ -6,6 +6,7 @@
 #include <sys/ipc.h>
 #include <sys/shm.h>
 
+#include <bit>
 #include <cerrno>
 #include <cstring>
 #include <fstream>
@@ -116,7 +117,7 @@ TEST_F(SharedMemory, ShowsOneRouteANode) {
     route.zeros(15).u8(hop);
   }
   ASSERT_EQ(route.bytes().size(), 184U);
-  daemon.write_segment(Segment::route, 2 * 184, route.bytes());
+  daemon.write_segment(Segment::route, size_t{2} * 184, route.bytes());
   ASSERT_EQ(hb_init_shared_memory(), Hb_Success);
   const Hb_route_sequence& entry = shared_route_info[2];
   EXPECT_EQ(entry.sequence_number, 5U);
@@ -135,7 +136,7 @@ TEST_F(SharedMemory, ShowsTheSecuritySegment) {
   write(4, ByteBuilder().u32(1).i32(11).u32(1).u32(0).u32(1).i32(3).raw("old"));
   write(284, ByteBuilder().u32(1).i32(12).u32(0).u32(1).u32(0).i32(4).raw("keys"));
   write(564, ByteBuilder().i32(5).raw("first"));
-  write(564 + 9 * 260, ByteBuilder().i32(4).raw("last"));
+  write(564 + size_t{9} * 260, ByteBuilder().i32(4).raw("last"));
   write(564 + 2600, ByteBuilder().u32(10));
   ASSERT_EQ(hb_init_shared_memory(), Hb_Success);
   const Hb_security_information& security = *security_info;
@@ -339,7 +340,7 @@ TEST_F(SharedMemory, DetachesNeitherNullNorAllOnes) {
   ASSERT_EQ(hb_init_shared_memory(), Hb_Success);
   ASSERT_EQ(shmdt(shared_route_info), 0);
   ASSERT_EQ(shmdt(data_for_client), 0);
-  shared_route_info = reinterpret_cast<Hb_route_sequence*>(intptr_t{-1});
+  shared_route_info = std::bit_cast<Hb_route_sequence*>(intptr_t{-1});
   data_for_client = nullptr;
   SystemCalls calls;
   hb_detach_shared_memory();
