@@ -189,6 +189,9 @@ namespace {
 
 template <typename Numbers, typename NumberOf>
 MemberSet set_of(const Numbers& numbers, std::size_t limit, NumberOf number_of) {
+  if (numbers.empty()) {
+    return {};
+  }
   MemberSet set(limit);
   for (const auto& each : numbers) {
     set.add(static_cast<std::size_t>(number_of(each)));
@@ -200,6 +203,7 @@ MemberSet set_of(const Numbers& numbers, std::size_t limit, NumberOf number_of) 
 
 std::vector<Event> Cluster::events_of(Delta& delta) {
   std::vector<Event> events;
+  events.reserve(4 + delta.notices.size());
   const auto tell = [&](auto body) {
     Event& event = events.emplace_back();
     event.sequence = ++sequence_;
@@ -210,8 +214,8 @@ std::vector<Event> Cluster::events_of(Delta& delta) {
   adapter_group_ += new_adapter_group ? 1 : 0;
   node_group_ += new_node_group ? 1 : 0;
 
-  const auto left = set_of(delta.died, configuration_.adapter_limit(), [](const auto& entry) { return entry.adapter; });
-  const auto left_nodes =
+  auto left = set_of(delta.died, configuration_.adapter_limit(), [](const auto& entry) { return entry.adapter; });
+  auto left_nodes =
       set_of(delta.died_nodes, static_cast<std::size_t>(configuration_.max_nodes), [](auto node) { return node; });
   if (!delta.died.empty()) {
     tell(AdapterEvent{Direction::Death, std::move(delta.died)});
@@ -229,10 +233,10 @@ std::vector<Event> Cluster::events_of(Delta& delta) {
     tell(NodeEvent{Direction::Join, std::move(delta.joined_nodes), delta.ffdc_id});
   }
   if (new_adapter_group) {
-    tell(AdapterGroupEvent{left});
+    tell(AdapterGroupEvent{std::move(left)});
   }
   if (new_node_group) {
-    tell(NodeGroupEvent{left_nodes});
+    tell(NodeGroupEvent{std::move(left_nodes)});
   }
   for (auto& notice : delta.notices) {
     tell(std::move(notice.body));
