@@ -130,6 +130,17 @@ TEST_P(TooLongPath, IsNotConnectedTo) {
   EXPECT_EQ(reply_from_server_deftimeout.tv_sec, time_limit.tv_sec);
 }
 
+TEST(TooLongPathAfterAFailedStart, LeavesTheConnectionClosed) {
+  const LeakAllowed connection_stays;
+  set_base_path("/tmp/once");
+  client_socket = new Hb_Csock;
+  setenv("HB_SERVER_SOCKET", std::string(108, 'x').c_str(), 1);
+  EXPECT_EQ(hb_init_communication(), Hb_Failure);
+  EXPECT_EQ(hb_get_errno(), 15);
+  EXPECT_EQ(client_socket, nullptr);
+  EXPECT_EQ(client_select, nullptr);
+}
+
 INSTANTIATE_TEST_SUITE_P(Variables, TooLongPath,
                          testing::Values(Path_Case{"Base", std::string(108, 'x'), unset, unset, ""},
                                          Path_Case{"LongBase", std::string(100000, 'x'), unset, unset, ""},

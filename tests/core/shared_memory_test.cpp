@@ -291,6 +291,13 @@ TEST_F(SharedMemory, OfNoNodesIsAskedForWithSizeZero) {
   EXPECT_EQ(calls.of("shmget")[1].arguments[1], 0);
 }
 
+TEST_F(SharedMemory, OfNoNodesIsRefusedAlsoWhereTheSystemDoesNot) {
+  daemon.write_segment(Segment::configuration, 4, ByteBuilder().u32(0).bytes());
+  EXPECT_EQ(hb_init_shared_memory(), Hb_Failure);
+  EXPECT_EQ(hb_get_errno(), 32);
+  EXPECT_EQ(shared_route_info, nullptr);
+}
+
 TEST_F(SharedMemory, OfMoreNodesThanAnySegmentHoldsFails) {
   daemon.write_segment(Segment::configuration, 4, ByteBuilder().u32(0xFFFFFFFFU).bytes());
   SystemCalls calls;

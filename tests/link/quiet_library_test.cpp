@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <csignal>
+#include <cstdlib>
 #include <string>
 #include <thread>
 #include <vector>
@@ -136,6 +137,17 @@ TEST_F(QuietLibrary, FailsWithItsNumberWhereThereIsNoDaemon) {
 }
 
 TEST_F(QuietLibrary, StartsInDaemonMode) { EXPECT_EQ(IsVEX, Hb_False); }
+
+// The mode that a program sets is the mode that the library reads: no connection is tried, so no error number is set.
+TEST(ModeFlag, OfTheProgramIsThatOfTheLibrary) {
+  setenv("HB_SERVER_SOCKET", "/nonexistent/socket", 1);
+  IsVEX = Hb_True;
+  EXPECT_EQ(hb_init(), Hb_Failure);
+  EXPECT_EQ(hb_get_errno(), 0);
+  IsVEX = Hb_False;
+  EXPECT_EQ(hb_init(), Hb_Failure);
+  EXPECT_EQ(hb_get_errno(), 15);
+}
 
 }  // namespace
 }  // namespace hb_test

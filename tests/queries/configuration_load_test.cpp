@@ -43,6 +43,36 @@ std::vector<int> present_nodes() {
   return nodes;
 }
 
+// ---- Look-ups follow the tables, whatever is done to them ----
+
+TEST_F(ConfigurationLoad, AnAdapterTakenOutOfItsTableIsNotFoundAnyMore) {
+  ASSERT_NE(&HB_INVALID_ADAP, hb_get_adap_entry(12));
+  Hash_delete(12, global_config_tbl.adap_hash);
+  EXPECT_EQ(&HB_INVALID_ADAP, hb_get_adap_entry(12));
+  EXPECT_NE(&HB_INVALID_ADAP, hb_get_adap_entry(13));
+}
+
+TEST_F(ConfigurationLoad, AnAdapterReplacedInItsTableIsFoundAsReplaced) {
+  Hb_Adapter other = {};
+  ASSERT_NE(&other, hb_get_adap_entry(12));
+  Hash_insert(12, global_config_tbl.adap_hash, &other);
+  EXPECT_EQ(&other, hb_get_adap_entry(12));
+}
+
+TEST_F(ConfigurationLoad, ATableInThePlaceOfAnotherAnswersForItself) {
+  Hb_Adapter only = {};
+  Hash_free(global_config_tbl.adap_hash);
+  global_config_tbl.adap_hash = Hash_init("other", 1);
+  Hash_insert(17, global_config_tbl.adap_hash, &only);
+  EXPECT_EQ(&only, hb_get_adap_entry(17));
+  EXPECT_EQ(&HB_INVALID_ADAP, hb_get_adap_entry(12));
+}
+
+TEST_F(ConfigurationLoad, AnEmptiedTableFindsNothing) {
+  Hash_clean(global_config_tbl.adap_hash);
+  EXPECT_EQ(&HB_INVALID_ADAP, hb_get_adap_entry(12));
+}
+
 // ---- Header ----
 
 TEST_F(ConfigurationLoad, TheHeaderFieldsBecomeTheTablesNumbers) {

@@ -1,6 +1,7 @@
 // Events that are not whole, and numbers outside what they index.
 #include <gtest/gtest.h>
 
+#include "hb_global_data/node_table.h"
 #include "hostile_input.h"
 
 namespace hb_test {
@@ -90,7 +91,6 @@ TEST_F(HostileInput, AnAdapterEventWithANegativeCountListsNoAdapter) {
 
 TEST_F(HostileInput, AnAdapterNumberBeyondTheListIsSkippedAndTheOthersCount) {
   for (const int32_t kind : {2, 3, 4}) {
-    GroupBytes expected(*out.group);
     const std::vector<AdapterEntry> entries = {{98352, 7}, {13, 5}, {0xFFFFFFFF, 8}, {0x80000000, 9}, {98351, 6}};
     EXPECT_EQ(Hb_Success, deliver(ReplyPacket(kind).message(adapter_event_message(entries)).bytes()));
     const Hb_Adapter_Membership_Grp& members = out.group->Hb_membership_grp_union.Hb_adapter_membership_grp;
@@ -100,6 +100,16 @@ TEST_F(HostileInput, AnAdapterNumberBeyondTheListIsSkippedAndTheOthersCount) {
     EXPECT_EQ(0xFFFFFFFFU, members.Hb_adapter_list[12]);
     EXPECT_EQ(0x5A5A5A5AU, members.Hb_adapter_list[98350]);
   }
+}
+
+TEST_F(HostileInput, AnAdapterThatTheListHasNoPlaceForKeepsItsState) {
+  hb_terminate();
+  connection = start_client(
+      daemon, sparse_cluster().adapter(98352, "10.9.9.9", 0, "far", 1).adapter(98351, "10.9.9.8", 0, "last", 1));
+  connected();
+  EXPECT_EQ(Hb_Success, deliver(ReplyPacket(2).message(adapter_event_message({{98352, 7}, {98351, 7}})).bytes()));
+  EXPECT_EQ(Hb_Entity_Up, hb_get_adap_entry(98352)->Hb_state);
+  EXPECT_EQ(Hb_Entity_Down, hb_get_adap_entry(98351)->Hb_state);
 }
 
 TEST_F(HostileInput, ALeaderOutsideTheListHasNoIncarnation) {

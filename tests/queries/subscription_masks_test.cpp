@@ -36,13 +36,22 @@ TEST_F(RecordOfSubscribe, NameAndEventsAreWrittenAndNothingElse) {
   char name[] = "follower";
   EXPECT_EQ(Hb_Success, hb_subscribe(name, &group, 0x0007));
   EXPECT_STREQ("follower", group.Hb_name);
-  EXPECT_EQ('\0', group.Hb_name[31]);
+  for (size_t index = 8; index < 32; ++index) EXPECT_EQ('\0', group.Hb_name[index]) << index;
   EXPECT_EQ(7, group.Hb_events);
   EXPECT_EQ(9, group.Hb_subscription_type);
   EXPECT_EQ(0x11111111, group.Hb_cursor);
   EXPECT_EQ(0x1111, group.Hb_netnum);
   EXPECT_EQ(0x11111111, count_of(group));
   for (size_t index = 0; index < 12296; ++index) ASSERT_EQ(0x11, set_byte(group, index)) << index;
+}
+
+TEST_F(RecordOfSubscribe, TheNameMayBeTheRecordsOwn) {
+  Hb_Subscription_Group group = group_filled_with(0x11, 9);
+  std::memcpy(group.Hb_name, "follower", 9);
+  EXPECT_EQ(Hb_Success, hb_subscribe(group.Hb_name, &group, 0x0007));
+  EXPECT_STREQ("follower", group.Hb_name);
+  EXPECT_EQ(Hb_Success, hb_subscribe(group.Hb_name + 6, &group, 0x0007));
+  EXPECT_STREQ("er", group.Hb_name);
 }
 
 TEST_F(RecordOfSubscribe, TheRecordKeeps31CharactersOfTheName) {
