@@ -52,14 +52,18 @@ Outcome outcome_of(Script script, uint64_t nodes, uint64_t published_routes) {
     }
   }
   for (int segment = 0; segment < 3; ++segment) {
-    if (const int number = script.next(segment == 0 ? first_get_numbers : other_get_numbers)) {
+    const int number = script.next(segment == 0 ? first_get_numbers : other_get_numbers);
+    if (segment == 1 && nodes == 0) {
+      return {size_does_not_fit, segment};  // whatever the system says
+    }
+    if (number != fuzz::no_error) {
       return {number, segment};
     }
     if (segment == 1 && nodes > published_routes) {
       return {size_does_not_fit, segment};
     }
-    if (const int number = script.next(attach_numbers)) {
-      return {number, segment};
+    if (const int fault = script.next(attach_numbers)) {
+      return {fault, segment};
     }
   }
   return {script.next(semaphore_numbers), 3};
