@@ -1,6 +1,8 @@
 /* Clients that read slowly or not at all, and many clients. */
 #include <gmock/gmock.h>
+#include <sys/resource.h>
 
+#include <filesystem>
 #include <memory>
 
 #include "daemon_process.h"
@@ -14,6 +16,19 @@ using testing::HasSubstr;
 
 const std::string endless = small_cluster + "\n[random]\nseed = 3\nmean_interval = \"100us\"\n";
 const std::string two_thousand_steps = small_cluster + "\n[random]\nseed = 3\nmean_interval = \"1s\"\ncount = 2000\n";
+
+/* Leaves the daemon one free descriptor: the limit is a number that no descriptor reaches. */
+void leave_one_descriptor(const DaemonProcess& daemon) {
+  const std::string descriptors = "/proc/" + std::to_string(daemon.pid()) + "/fd/";
+  rlim_t limit = 0;
+  for (int unused = 0; unused < 2; ++limit) {
+    unused += std::filesystem::is_symlink(descriptors + std::to_string(limit)) ? 0 : 1;
+  }
+  rlimit limits{};
+  ASSERT_EQ(prlimit(daemon.pid(), RLIMIT_NOFILE, nullptr, &limits), 0);
+  limits.rlim_cur = limit - 1;
+  ASSERT_EQ(prlimit(daemon.pid(), RLIMIT_NOFILE, &limits, nullptr), 0);
+}
 
 TEST(Client, that_does_not_read_is_disconnected_and_logged_while_another_is_served) {
   const TemporaryDirectory directory;
@@ -60,6 +75,27 @@ TEST(Client, finds_room_for_two_configurations_whatever_the_bound) {
   client.send(ByteWriter().raw(request(201, {})).raw(request(201, {})).bytes());
   EXPECT_TRUE(client.receive());
   EXPECT_TRUE(client.receive());
+}
+
+TEST(Client, is_turned_away_while_no_descriptor_is_free_and_the_others_are_served) {
+  const TemporaryDirectory directory;
+  DaemonProcess daemon(directory, {"--socket", directory.path("socket")});
+  ASSERT_TRUE(daemon.wait_until_ready());
+  auto served = std::make_unique<Connection>(directory.path("socket"));
+  ASSERT_TRUE(served->configuration());
+  leave_one_descriptor(daemon);
+  Connection last(directory.path("socket"));
+  ASSERT_TRUE(last.configuration());
+
+  const Connection unwanted(directory.path("socket"));
+  EXPECT_TRUE(unwanted.wait_until_ended());
+  EXPECT_THAT(daemon.log(), HasSubstr("a client was turned away: no descriptor is free, with 2 clients; raise the "
+                                      "limit (ulimit -n)"));
+  EXPECT_TRUE(last.configuration());
+  served.reset();
+  EXPECT_TRUE(last.configuration());
+  Connection next(directory.path("socket"));
+  EXPECT_TRUE(next.configuration());
 }
 
 TEST(AsFastAsRead, loses_nothing_for_a_client_that_starts_to_read_late) {
