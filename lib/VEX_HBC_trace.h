@@ -1,6 +1,7 @@
 // The trace component "_HBC": registration, and making records in one of its three categories.
 #pragma once
 
+#include <cerrno>
 #include <cstdint>
 
 #include "trace_records.h"
@@ -20,15 +21,31 @@ void hbc_initialize_trace_once();
 
 inline constexpr const char* hbc_trace_component = "_HBC";
 
+// Making a record changes nothing for its caller, whatever the trace library does to `errno`.
+class Errno_Kept {
+ public:
+  Errno_Kept() = default;
+  Errno_Kept(const Errno_Kept&) = delete;
+  Errno_Kept& operator=(const Errno_Kept&) = delete;
+  ~Errno_Kept() { errno = saved_; }
+
+ private:
+  const int saved_ = errno;
+};
+
 inline bool trace_is_on(Trace_Category category) { return hbc_trace_detail_levels[category] != 0; }
 
 inline void trace(Trace_Category category, Trace_Record record) {
-  if (trace_is_on(category)) tr_ms_record_id_1(hbc_trace_component, record, pTokens[category]);
+  if (trace_is_on(category)) {
+    const Errno_Kept kept;
+    tr_ms_record_id_1(hbc_trace_component, record, pTokens[category]);
+  }
 }
 
 template <typename... Values>
 void trace_values(Trace_Category category, Trace_Record record, Values... values) {
   if (trace_is_on(category)) {
+    const Errno_Kept kept;
     tr_ms_record_values_32_1(hbc_trace_component, record, pTokens[category], static_cast<uint32_t>(sizeof...(values)),
                              static_cast<uint32_t>(values)...);
   }
@@ -42,6 +59,7 @@ struct Trace_Block {
 
 inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a, Trace_Block b) {
   if (trace_is_on(category)) {
+    const Errno_Kept kept;
     tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], 2, a.bytes, a.length, b.bytes, b.length);
   }
 }
@@ -49,6 +67,7 @@ inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block
 inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a, Trace_Block b, Trace_Block c,
                        Trace_Block d) {
   if (trace_is_on(category)) {
+    const Errno_Kept kept;
     tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], 4, a.bytes, a.length, b.bytes, b.length,
                         c.bytes, c.length, d.bytes, d.length);
   }

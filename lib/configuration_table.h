@@ -31,6 +31,11 @@ inline Hb_Adapter_Number adapter_number_limit(const Hb_Configuration_Internal& t
          static_cast<Hb_Adapter_Number>(table.Hb_max_nodes);
 }
 
+// How many records the adapter list holds; none while there is no list.
+inline int adapters_in_list(const Hb_Configuration_Internal& table) {
+  return table.Hb_global_adapter_list != nullptr ? table.Hb_num_adapters : 0;
+}
+
 inline bool is_node_number(const Hb_Configuration_Internal& table, int node) {
   return node >= 0 && node < table.Hb_max_nodes;
 }

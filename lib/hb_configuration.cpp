@@ -87,7 +87,7 @@ Hb_Rc process_adapter_number_list(Hb_Adapter_Number* adapter, Hb_Cursor* cursor,
     return Hb_Failure;
   }
   return walk(
-      adapter, cursor, trans, table().Hb_num_adapters, HB_NO_ADAPTER, [](int) { return true; },
+      adapter, cursor, trans, adapters_in_list(table()), HB_NO_ADAPTER, [](int) { return true; },
       [](int position) { return table().Hb_global_adapter_list[position].Hb_adapter_num; });
 }
 
@@ -117,7 +117,7 @@ Hb_Rc process_adapter_in_network_list(Hb_Network_Number network, Hb_Adapter_Numb
     return Hb_Failure;
   }
   return walk(
-      adapter, cursor, trans, table().Hb_num_adapters, HB_NO_ADAPTER,
+      adapter, cursor, trans, adapters_in_list(table()), HB_NO_ADAPTER,
       [network](int position) { return table().Hb_global_adapter_list[position].Hb_network == network; },
       [](int position) { return table().Hb_global_adapter_list[position].Hb_adapter_num; });
 }
@@ -212,7 +212,7 @@ Hb_Rc hb_get_adapter_number_by_address(Hb_IP_address6 address, Hb_Adapter_Number
     return Hb_Failure;
   }
   const Hb_Adapter* const begin = table().Hb_global_adapter_list;
-  const Hb_Adapter* const end = begin + (begin != nullptr ? table().Hb_num_adapters : 0);
+  const Hb_Adapter* const end = begin + adapters_in_list(table());
   const Hb_Adapter* const found = std::find_if(begin, end, [&address](const Hb_Adapter& candidate) {
     return std::memcmp(&candidate.Hb_ip_address, &address, sizeof address) == 0;
   });

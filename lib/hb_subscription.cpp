@@ -95,7 +95,7 @@ Hb_Rc hb_change_network_in_subscription_group(Hb_Subscription_Group* group, Hb_N
       !prepare(group, network_worker, add, rc)) {
     return rc;
   }
-  std::for_each_n(table().Hb_global_adapter_list, table().Hb_num_adapters, [=](const Hb_Adapter& adapter) {
+  std::for_each_n(table().Hb_global_adapter_list, adapters_in_list(table()), [=](const Hb_Adapter& adapter) {
     if (adapter.Hb_network == network) {
       Member_Set(group).change(adapter.Hb_adapter_num, add == 1);
     }
@@ -227,11 +227,8 @@ Hb_Rc wake_new_group_monitor(char request) {
   const int descriptor = new_group_event_handler_p->getWriteFd();
   const ssize_t written = write(descriptor, &request, sizeof request);
   if (written != 1) {
-    const int saved_errno = errno;
-    trace_values(Trace_Info, trace_new_group_write_failed, written, saved_errno);
-    set_hb_errno(HB_EEVENTPIPE);
-    errno = saved_errno;
-    return Hb_Failure;
+    trace_values(Trace_Info, trace_new_group_write_failed, written, errno);
+    return fail(HB_EEVENTPIPE);
   }
   trace_values(Trace_Info, trace_new_group_written, descriptor);
   return Hb_Success;
@@ -289,7 +286,7 @@ Hb_Rc hb_add_all_adapters_to_subscription_group(Hb_Subscription_Group* group) {
   }
   reset(group, adapter_worker);
   Member_Set members(group);
-  std::for_each_n(table().Hb_global_adapter_list, table().Hb_num_adapters,
+  std::for_each_n(table().Hb_global_adapter_list, adapters_in_list(table()),
                   [&members](const Hb_Adapter& adapter) { members.change(adapter.Hb_adapter_num, true); });
   members.set_count(table().Hb_num_adapters);
   return Hb_Success;

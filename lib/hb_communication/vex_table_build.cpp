@@ -13,12 +13,11 @@ Hb_Rc hb_vex_update_global_tbl(Hb_Configuration_Internal* /*cfg_table*/, zu_evm_
                                zu_vex_net_intf_info_t* /*p_src_intf_tbl*/) {
   static constexpr char call[] = "zu_vex_get_cluster_info()";
   static constexpr char variant[] = "(Default)";
-  const int saved_errno = errno;
   const int result = absent;
+  const int error = errno;
   set_hb_errno(HB_EVEXTBL_BUILD);
   trace_data(Trace_Errors, trace_table_query_failed, {call, sizeof call}, {variant, sizeof variant},
-             {&result, sizeof result}, {&saved_errno, sizeof saved_errno});
-  errno = saved_errno;
+             {&result, sizeof result}, {&error, sizeof error});
   return Hb_Failure;
 }
 
