@@ -45,6 +45,7 @@ HB_STATIC_ASSERT(sizeof(Hb_Network) == 86, "networks are 86 bytes");
 HB_STATIC_ASSERT(offsetof(Hb_Network, Hb_network_type) == 70, "network type at 70");
 HB_STATIC_ASSERT(sizeof(Hb_Node_config_state) == 12, "node states are 12 bytes");
 HB_STATIC_ASSERT(sizeof(Hb_Site) == 8, "sites are 8 bytes");
+HB_STATIC_ASSERT(offsetof(Hb_Site, Hb_state) == 4, "site state at 4");
 
 /*
  * Every query starts the client when it is not running, and fails as hb_init() does when that fails. A null output

@@ -123,6 +123,15 @@ HB_STATIC_ASSERT(sizeof(Hb_Boolean) == 4, "truth values are 4 bytes");
 HB_STATIC_ASSERT(sizeof(Hb_Entity_State) == 4, "entity states are 4 bytes");
 HB_STATIC_ASSERT(sizeof(Hb_Entity_State_Reason) == 4, "state reasons are 4 bytes");
 HB_STATIC_ASSERT(sizeof(Hb_Group_Status) == 4, "group states are 4 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_Node_Number) == 2 && (Hb_Node_Number)-1 < 0, "node numbers are signed, 2 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_Adapter_Number) == 4 && (Hb_Adapter_Number)-1 > 0, "adapter numbers are unsigned, 4 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_Network_Number) == 2 && (Hb_Network_Number)-1 < 0, "network numbers are signed, 2 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_Site_Number) == 2 && (Hb_Site_Number)-1 > 0, "site numbers are unsigned, 2 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_Cursor) == 4 && (Hb_Cursor)-1 < 0, "cursors are signed, 4 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_Incarnation) == 4 && (Hb_Incarnation)-1 > 0, "incarnations are unsigned, 4 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_Seq_Num) == 4 && (Hb_Seq_Num)-1 > 0, "event numbers are unsigned, 4 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_Config_Instance) == 4 && (Hb_Config_Instance)-1 > 0, "instances are unsigned, 4 bytes");
+HB_STATIC_ASSERT(sizeof(Hb_IP_address4) == 4 && (Hb_IP_address4)-1 > 0, "IPv4 addresses are unsigned, 4 bytes");
 HB_STATIC_ASSERT(sizeof(Hb_IP_address6) == 16, "addresses are 16 bytes");
 HB_STATIC_ASSERT(sizeof(zu_timeval32) == 8, "short times are 8 bytes");
 

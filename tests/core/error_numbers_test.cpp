@@ -1,5 +1,7 @@
-// The error number: its values and names, and how it is kept.
+// The error number, how it is kept, and the numbers of all names that results, states and reasons have.
 #include <gtest/gtest.h>
+
+#include <span>
 
 #include "hb_client/error.h"
 #include "hb_global_data/state.h"
@@ -7,7 +9,7 @@
 namespace hb_test {
 namespace {
 
-struct Numbered_Error {
+struct Numbered_Name {
   int number;
   int value;
   const char* name;
@@ -16,7 +18,7 @@ struct Numbered_Error {
 #define HB_NUMBERED(number, name) \
   { number, name, #name }
 
-constexpr Numbered_Error errors[] = {
+constexpr Numbered_Name errors[] = {
     HB_NUMBERED(1, HB_ENOMORE),
     HB_NUMBERED(2, HB_ENOTREADY),
     HB_NUMBERED(3, HB_EWRONGSTATE),
@@ -95,11 +97,33 @@ constexpr Numbered_Error errors[] = {
     HB_NUMBERED(91, HB_EMIGRATE_EVENTS),
 };
 
-TEST(ErrorNumbers, HaveTheirNames) {
-  for (const Numbered_Error& error : errors) {
-    EXPECT_EQ(error.value, error.number) << error.name;
+constexpr Numbered_Name states[] = {
+    HB_NUMBERED(0, Hb_Entity_Undef),
+    HB_NUMBERED(1, Hb_Entity_Up),
+    HB_NUMBERED(2, Hb_Entity_Down),
+};
+
+constexpr Numbered_Name reasons[] = {
+    HB_NUMBERED(0, Hb_Entity_State_Reason_Down),
+    HB_NUMBERED(1, Hb_Entity_State_Reason_Up),
+    HB_NUMBERED(2, Hb_Entity_State_Reason_BRIXD_Down),
+    HB_NUMBERED(3, Hb_Entity_State_Reason_BRIXD_Up),
+    HB_NUMBERED(4, Hb_Entity_State_Reason_LOCAL_SPLIT_Down),
+    HB_NUMBERED(5, Hb_Entity_State_Reason_REMOTE_SPLIT_Down),
+    HB_NUMBERED(6, Hb_Entity_State_Reason_LINK_Down),
+    HB_NUMBERED(7, Hb_Entity_State_Reason_SHUT_Down),
+    HB_NUMBERED(8, Hb_Entity_State_Reason_FORCE_Down),
+    HB_NUMBERED(9, Hb_Entity_State_Reason_STOPPED_Down),
+    HB_NUMBERED(10, Hb_Entity_State_Reason_Undef),
+};
+
+void expect_numbers(std::span<const Numbered_Name> names) {
+  for (const Numbered_Name& name : names) {
+    EXPECT_EQ(name.value, name.number) << name.name;
   }
 }
+
+TEST(ErrorNumbers, HaveTheirNames) { expect_numbers(errors); }
 
 TEST(ErrorNumbers, Are76) { EXPECT_EQ(std::size(errors), 76U); }
 
@@ -126,6 +150,10 @@ TEST(TruthValues, HaveTheirNumbers) {
   EXPECT_EQ(static_cast<int>(Hb_True), 1);
   EXPECT_EQ(sizeof(Hb_Boolean), 4U);
 }
+
+TEST(EntityStates, HaveTheirNumbers) { expect_numbers(states); }
+
+TEST(EntityStateReasons, HaveTheirNumbers) { expect_numbers(reasons); }
 
 }  // namespace
 }  // namespace hb_test

@@ -341,10 +341,16 @@ TEST_F(StartUp, TerminateLeavesTheSitesAlone) {
   auto* table = reinterpret_cast<H_table_str*>(&site);
   global_config_tbl.site_hash = table;
   global_config_tbl.site_list = &site;
+  global_site_tbl[1] = Hb_True;
+  global_num_sites = 1;
   hb_terminate();
   EXPECT_EQ(global_config_tbl.site_hash, table);
   EXPECT_EQ(global_config_tbl.site_list, &site);
+  EXPECT_THAT(global_site_tbl, ElementsAre(Hb_False, Hb_True));
+  EXPECT_EQ(global_num_sites, 1);
   global_config_tbl = {};
+  global_site_tbl[1] = Hb_False;
+  global_num_sites = 0;
 }
 
 TEST_F(StartUp, TerminateTwiceDoesNothingTheSecondTime) {

@@ -410,6 +410,12 @@ TEST_F(ConfigurationAtStart, IsLoadedFromTheAnswer) {
   EXPECT_EQ(&global_config_tbl.Hb_global_adapter_list[3], by_number(17));
 }
 
+TEST_F(ConfigurationAtStart, HasNoSites) {
+  EXPECT_EQ(Hb_Success, start_with(configuration_answer(sparse_cluster())));
+  EXPECT_THAT(global_site_tbl, ElementsAre(Hb_False, Hb_False));
+  EXPECT_EQ(0, global_num_sites);
+}
+
 TEST_F(ConfigurationAtStart, TheRestOfTheAnswersHeaderDoesNotMatter) {
   const Bytes answer = ReplyPacket(0)
                            .leader(1, 2)

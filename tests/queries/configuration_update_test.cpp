@@ -85,11 +85,15 @@ TEST_F(EventReception, AConfigurationUpdateLeavesTheSitesAlone) {
   global_config_tbl.site_list = sites;
   global_config_tbl.Hb_max_sites = 2;
   global_config_tbl.Hb_num_sites = 1;
+  global_site_tbl[1] = Hb_True;
+  global_num_sites = 1;
   EXPECT_EQ(Hb_Success, deliver(telling_packet(9).message(changed_cluster().bytes())));
   EXPECT_EQ(&site_table, global_config_tbl.site_hash);
   EXPECT_EQ(sites, global_config_tbl.site_list);
   EXPECT_EQ(2, global_config_tbl.Hb_max_sites);
   EXPECT_EQ(1, global_config_tbl.Hb_num_sites);
+  EXPECT_THAT(global_site_tbl, ElementsAre(Hb_False, Hb_True));
+  EXPECT_EQ(1, global_num_sites);
   global_config_tbl.site_hash = nullptr;
   global_config_tbl.site_list = nullptr;
 }

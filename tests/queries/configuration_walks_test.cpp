@@ -4,11 +4,14 @@
 #include <cstring>
 #include <functional>
 #include <ostream>
+#include <utility>
 
 #include "configuration_queries.h"
 
 namespace hb_test {
 namespace {
+
+using testing::ElementsAre;
 
 // One first/next pair, with what it is to yield in the sparse cluster.
 struct Walk {
@@ -123,6 +126,126 @@ TEST_P(Walks, RefuseANullCursor) {
 
 INSTANTIATE_TEST_SUITE_P(ConfigurationQueries, Walks, testing::ValuesIn(walks()),
                          [](const auto& test) { return std::string(test.param.name); });
+
+// All items of a walk, and behind them what it stores at its end.
+template <typename Number, typename First, typename Next>
+std::vector<int64_t> walked(First first, Next next) {
+  constexpr size_t too_many = 100;
+  std::vector<int64_t> items;
+  Number item = 77;
+  Hb_Cursor cursor = 55;
+  set_hb_errno(untouched_error);
+  Hb_Rc result = first(&item, &cursor);
+  while (result == Hb_Success && items.size() < too_many) {
+    items.push_back(item);
+    result = next(&item, &cursor);
+  }
+  EXPECT_EQ(1, hb_get_errno());
+  items.push_back(item);
+  return items;
+}
+
+std::vector<int64_t> walked_nodes() {
+  return walked<Hb_Node_Number>(hb_get_first_configured_node_number, hb_get_next_configured_node_number);
+}
+
+std::vector<int64_t> walked_adapters() {
+  return walked<Hb_Adapter_Number>(hb_get_first_configured_adapter_number, hb_get_next_configured_adapter_number);
+}
+
+std::vector<int64_t> walked_adapters_of_node(Hb_Node_Number node) {
+  return walked<Hb_Adapter_Number>(
+      [node](auto* item, auto* cursor) { return hb_get_first_configured_adapter_in_node(node, item, cursor); },
+      [node](auto* item, auto* cursor) { return hb_get_next_configured_adapter_in_node(node, item, cursor); });
+}
+
+std::vector<int64_t> walked_networks() {
+  return walked<Hb_Network_Number>(hb_get_first_configured_network_number, hb_get_next_configured_network_number);
+}
+
+std::vector<int64_t> walked_adapters_of_network(Hb_Network_Number network) {
+  return walked<Hb_Adapter_Number>(
+      [network](auto* item, auto* cursor) { return hb_get_first_configured_adapter_in_network(network, item, cursor); },
+      [network](auto* item, auto* cursor) { return hb_get_next_configured_adapter_in_network(network, item, cursor); });
+}
+
+std::vector<int64_t> walked_sites() {
+  return walked<Hb_Site_Number>(hb_get_first_configured_site_number, hb_get_next_configured_site_number);
+}
+
+TEST_F(ConfigurationQueries, EveryRecordOfTheListCounts) {
+  // One number for the second time, and one behind the last node's.
+  reload(sparse_cluster().adapter(17, "10.0.9.9", 1).adapter(32, "10.9.9.9", 1));
+  int adapters = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_number_of_configured_adapters(&adapters); }));
+  EXPECT_EQ(7, adapters);
+  EXPECT_THAT(walked_adapters(), ElementsAre(13, 0, 12, 17, 2, 17, 32, 0xFFFFFFFF));
+  EXPECT_THAT(walked_adapters_of_network(1), ElementsAre(13, 17, 17, 32, 0xFFFFFFFF));
+  Hb_Adapter_Number adapter = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_adapter_number_by_address(address_of("10.9.9.9"), &adapter); }));
+  EXPECT_EQ(32U, adapter);
+}
+
+TEST_F(ConfigurationQueries, AnAdapterTakenOutOfItsTableIsLeftInTheListOnly) {
+  ASSERT_NE(nullptr, Hash_delete(12, global_config_tbl.adap_hash));
+  Hb_Adapter_Number adapter = 99;
+  EXPECT_TRUE(fails_with(7, [&] { return hb_get_adapter_number_by_node_number(3, 0, &adapter); }));
+  EXPECT_EQ(99U, adapter);
+  Hb_Node_Number node;
+  EXPECT_TRUE(fails_with(7, [&] { return hb_get_node_number_by_adapter_number(12, &node); }));
+  Hb_IP_address6 address;
+  EXPECT_TRUE(fails_with(7, [&] { return hb_get_adapter_address_by_number(12, &address); }));
+  char type[36];
+  EXPECT_TRUE(fails_with(7, [&] { return hb_get_adapter_type_by_number(12, type); }));
+  int adapters = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_number_of_configured_adapters_in_node(3, &adapters); }));
+  EXPECT_EQ(1, adapters);
+  EXPECT_THAT(walked_adapters_of_node(3), ElementsAre(13, 0xFFFFFFFF));
+  EXPECT_TRUE(succeeds([&] { return hb_get_number_of_configured_adapters(&adapters); }));
+  EXPECT_EQ(5, adapters);
+  EXPECT_THAT(walked_adapters(), ElementsAre(13, 0, 12, 17, 2, 0xFFFFFFFF));
+  EXPECT_TRUE(succeeds([&] { return hb_get_adapter_number_by_address(address_of("10.0.0.3"), &adapter); }));
+  EXPECT_EQ(12U, adapter);
+}
+
+TEST_F(ConfigurationQueries, TheFlagOfANodeSaysWhetherItIsConfiguredNotItsAdapters) {
+  global_node_tbl[1] = Hb_True;
+  global_node_tbl[3] = Hb_False;
+  EXPECT_THAT(walked_nodes(), ElementsAre(0, 1, 4, -1));
+  int adapters = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_number_of_configured_adapters_in_node(1, &adapters); }));
+  EXPECT_EQ(0, adapters);
+  EXPECT_THAT(walked_adapters_of_node(1), ElementsAre(0xFFFFFFFF));
+  EXPECT_TRUE(fails_with(9, [&] { return hb_get_number_of_configured_adapters_in_node(3, &adapters); }));
+  Hb_Adapter_Number adapter = 99;
+  Hb_Cursor cursor = 0;
+  EXPECT_TRUE(fails_with(9, [&] { return hb_get_first_configured_adapter_in_node(3, &adapter, &cursor); }));
+  EXPECT_TRUE(fails_with(9, [&] { return hb_get_next_configured_adapter_in_node(3, &adapter, &cursor); }));
+  EXPECT_EQ(99U, adapter);
+}
+
+TEST_F(ConfigurationQueries, WithoutAnAdapterListNoAdapterIsFoundInIt) {
+  Hb_Adapter* const list = std::exchange(global_config_tbl.Hb_global_adapter_list, nullptr);
+  Hb_Adapter_Number adapter = 99;
+  EXPECT_TRUE(fails_with(7, [&] { return hb_get_adapter_number_by_address(address_of("10.0.1.3"), &adapter); }));
+  EXPECT_EQ(0xFFFFFFFFU, adapter);
+  EXPECT_THAT(walked_adapters(), ElementsAre(0xFFFFFFFF));
+  EXPECT_THAT(walked_adapters_of_network(1), ElementsAre(0xFFFFFFFF));
+  global_config_tbl.Hb_global_adapter_list = list;
+}
+
+TEST_F(ConfigurationQueries, ANetworkBeyondTheAdaptersPerNodeIsNotWalked) {
+  reload(sparse_cluster().network("net_fifth"));
+  EXPECT_THAT(walked_networks(), ElementsAre(0, 1, 3, -1));
+}
+
+TEST_F(ConfigurationQueries, SitesAreWalkedBelowTheirMaximumAndNoFurtherThanTheirFlags) {
+  global_site_tbl[0] = global_site_tbl[1] = Hb_True;
+  global_config_tbl.Hb_max_sites = 1;
+  EXPECT_THAT(walked_sites(), ElementsAre(0, 65535));
+  global_config_tbl.Hb_max_sites = 5;
+  EXPECT_THAT(walked_sites(), ElementsAre(0, 1, 65535));
+}
 
 TEST_F(ConfigurationQueries, TheAdaptersOfANodeOutOfRangeOrWithoutAnyAreNotWalked) {
   Hb_Adapter_Number adapter = 99;

@@ -1,4 +1,4 @@
-// What all queries have in common: starting the client, null outputs, trace and mode.
+// What all queries have in common: starting the client, null outputs, trace and mode, and that they only read.
 #include <gmock/gmock.h>
 
 #include <cstring>
@@ -6,11 +6,14 @@
 #include <ostream>
 
 #include "configuration_queries.h"
+#include "hostile_input.h"
 #include "support/running_client.h"
+#include "support/system_calls.h"
 
 namespace hb_test {
 namespace {
 
+using testing::Each;
 using testing::IsEmpty;
 
 // Room for any output, filled with a pattern that no query writes.
@@ -116,6 +119,12 @@ std::string name_of_query(const testing::TestParamInfo<Query>& test) { return te
 // Whether the query is one of the two on sites, which never succeed in the sparse cluster.
 bool walks_sites(const Query& query) { return std::strstr(query.name, "configured_site_number") != nullptr; }
 
+// The state, the hash tables of the configuration, and the sites.
+Bytes image_of_configuration() {
+  return image_of_state() + image_of(global_config_tbl.adap_hash) + image_of(global_config_tbl.ip_hash) +
+         image_of(global_config_tbl.node_hash) + image_of(global_site_tbl, HB_MAX_SITES) + image_of(&global_num_sites);
+}
+
 class EveryQuery : public testing::TestWithParam<Query> {
  protected:
   EveryQuery() {
@@ -132,6 +141,19 @@ TEST_P(EveryQuery, FailsAsTheStartDoesWhileNoDaemonIsThere) {
   EXPECT_TRUE(fails_with(15, [&] { return GetParam().call(&outputs); }));
   EXPECT_TRUE(outputs.untouched());
   EXPECT_EQ(0, query_cursor);
+}
+
+TEST_P(EveryQuery, FailsInVexModeWithoutClusterServicesAndSetsNoErrorNumber) {
+  reset_platform();
+  IsVEX = Hb_True;
+  query_cursor = 55;
+  Outputs outputs;
+  SystemCalls calls;
+  EXPECT_TRUE(fails_without_error_number([&] { return GetParam().call(&outputs); }));
+  EXPECT_TRUE(calls.of("socket").empty());
+  EXPECT_TRUE(outputs.untouched());
+  EXPECT_EQ(55, query_cursor);
+  IsVEX = Hb_False;
 }
 
 TEST_P(EveryQuery, RefusesANullOutput) {
@@ -151,6 +173,25 @@ TEST_P(EveryQuery, StartsTheClientByItself) {
   EXPECT_FALSE(outputs.untouched());
   daemon.take_connection();
   hb_terminate();
+}
+
+TEST_P(EveryQuery, ChangesNothingInTheConfiguration) {
+  load(sparse_cluster());
+  const Bytes before = image_of_configuration();
+  Outputs outputs;
+  GetParam().call(&outputs);
+  EXPECT_TRUE(before == image_of_configuration());
+  unload();
+}
+
+TEST_P(EveryQuery, TakesNoLock) {
+  load(sparse_cluster());
+  Outputs outputs;
+  SystemCalls calls;
+  GetParam().call(&outputs);
+  EXPECT_TRUE(calls.of("pthread_mutex_lock").empty());
+  EXPECT_TRUE(calls.of("semop").empty());
+  unload();
 }
 
 TEST_P(EveryQuery, TracesNothingBelowTheInfoCategory) {
@@ -186,7 +227,10 @@ TEST_P(UntracedQuery, TracesNothingAtAll) {
   load(sparse_cluster());
   trace_all();
   Outputs outputs;
-  GetParam().call(&outputs);
+  for (const Hb_Cursor cursor : {0, 98352}) {  // the second one is the end of each walk
+    query_cursor = cursor;
+    GetParam().call(&outputs);
+  }
   EXPECT_THAT(platform_double().traces, IsEmpty());
   trace_nothing();
   unload();
@@ -205,6 +249,39 @@ std::vector<Query> untraced_queries() {
 }
 
 INSTANTIATE_TEST_SUITE_P(ConfigurationQueries, UntracedQuery, testing::ValuesIn(untraced_queries()), name_of_query);
+
+TEST_F(ConfigurationQueries, AFailureTracesNothing) {
+  trace_all();
+  int count;
+  Hb_Node_Number node;
+  Hb_Adapter_Number adapter;
+  Hb_Network_Number network;
+  Hb_IP_address6 address;
+  char text[70];
+  char unknown_name[] = "net_disk_02";
+  std::vector<Hb_Rc> results;
+  for (const Hb_Adapter_Number unknown : {31U, 32U}) {
+    results.push_back(hb_get_node_number_by_adapter_number(unknown, &node));
+    results.push_back(hb_get_adapter_address_by_number(unknown, &address));
+    results.push_back(hb_get_adapter_type_by_number(unknown, text));
+  }
+  for (const Hb_Node_Number unknown : std::initializer_list<Hb_Node_Number>{1, 8}) {
+    results.push_back(hb_get_adapter_number_by_node_number(unknown, 0, &adapter));
+    results.push_back(hb_get_number_of_configured_adapters_in_node(unknown, &count));
+    results.push_back(hb_get_first_configured_adapter_in_node(unknown, &adapter, &query_cursor));
+    results.push_back(hb_get_next_configured_adapter_in_node(unknown, &adapter, &query_cursor));
+  }
+  for (const Hb_Network_Number unknown : std::initializer_list<Hb_Network_Number>{2, 4}) {
+    results.push_back(hb_get_network_name_by_number(unknown, text));
+    results.push_back(hb_get_first_configured_adapter_in_network(unknown, &adapter, &query_cursor));
+    results.push_back(hb_get_next_configured_adapter_in_network(unknown, &adapter, &query_cursor));
+  }
+  results.push_back(hb_get_network_type_by_number(4, text));
+  results.push_back(hb_get_adapter_number_by_address(address_of("10.0.0.4"), &adapter));
+  results.push_back(hb_get_network_number_by_name(unknown_name, &network));
+  EXPECT_THAT(results, Each(Hb_Failure));
+  EXPECT_THAT(platform_double().traces, IsEmpty());
+}
 
 TEST_F(ConfigurationQueries, ANullNameIsRefused) {
   Hb_Network_Number network = 99;

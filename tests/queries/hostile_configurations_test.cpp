@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <ostream>
+#include <thread>
 
 #include "hb_communication/configuration_load.h"
 #include "hb_communication/shared_memory.h"
@@ -96,6 +97,17 @@ TEST_F(HostileInput, ConfigurationsAtTheLimitsAreTaken) {
     EXPECT_EQ(nodes, global_config_tbl.Hb_max_nodes);
     EXPECT_EQ(adapters_per_node, global_config_tbl.Hb_adapters_per_node);
   }
+}
+
+TEST_F(HostileInput, MoreAdaptersThanNumbersAreRefusedEvenWhenAllOfThemAreSent) {
+  const Bytes header = ConfigurationMessage().max_nodes(2049).adapters_per_node(48).claim_adapters(98353).bytes();
+  const Bytes packet = ReplyPacket(9).message(header + Bytes(98353 * sizeof(Hb_Adapter), '\0')).bytes();
+  const Bytes before = image_of_state();
+  std::thread sender([&] { connection.send_frame(packet); });
+  EXPECT_TRUE(fails_with(10, [&] { return take(); }));
+  sender.join();
+  EXPECT_TRUE(out.untouched());
+  EXPECT_TRUE(before == image_of_state());
 }
 
 TEST_F(HostileInput, AnEventOfTheLargestClusterFillsTheWholeListAndNothingBehindIt) {

@@ -287,6 +287,7 @@ TEST_F(ConfigurationQueries, TheNodeOfAnAdapterIsTraced) {
   hb_get_node_number_by_adapter_number(17, &node);
   ASSERT_EQ(1U, platform_double().traces.size());
   const Recorded_Trace& trace = platform_double().traces[0];
+  EXPECT_EQ("_HBC", trace.component);
   EXPECT_EQ(301U, trace.id);
   EXPECT_EQ(1, trace.category);
   EXPECT_THAT(trace.values, ElementsAre(17, 4));
@@ -298,6 +299,7 @@ TEST_F(ConfigurationQueries, TheAddressOfAnAdapterIsTracedAsText) {
   hb_get_adapter_address_by_number(13, &address);
   ASSERT_EQ(1U, platform_double().traces.size());
   const Recorded_Trace& trace = platform_double().traces[0];
+  EXPECT_EQ("_HBC", trace.component);
   EXPECT_EQ(302U, trace.id);
   EXPECT_EQ(1, trace.category);
   ASSERT_EQ(2U, trace.blocks.size());
@@ -311,6 +313,7 @@ TEST_F(ConfigurationQueries, TheTypeOfAnAdapterIsTraced) {
   hb_get_adapter_type_by_number(2, type);
   ASSERT_EQ(1U, platform_double().traces.size());
   const Recorded_Trace& trace = platform_double().traces[0];
+  EXPECT_EQ("_HBC", trace.component);
   EXPECT_EQ(303U, trace.id);
   EXPECT_EQ(1, trace.category);
   ASSERT_EQ(2U, trace.blocks.size());
