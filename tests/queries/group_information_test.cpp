@@ -3,6 +3,7 @@
 
 #include <cstdlib>
 #include <cstring>
+#include <type_traits>
 
 #include "membership.h"
 #include "platform_doubles.h"
@@ -13,17 +14,22 @@ namespace {
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-TEST_F(Membership, TheFailureDataIdentifierComesWithAllItsBytes) {
+TEST_F(Membership, TheFailureDataIdentifierComesWithAllItsBytesAndNoMore) {
   for (const Hb_Events events : {1, 2, 8}) {
     for (const int type : {0, 1, 2}) {
       make_adapter_group(events);
-      group->Hb_group_type = static_cast<Hb_Group_Type>(type);
+      set_type(type);
       for (size_t index = 0; index < 43; ++index) group->Hb_ffdc_id[index] = static_cast<char>('A' + index);
-      Hb_FFDC_Id identifier = {};
-      EXPECT_TRUE(succeeds([&] { return hb_get_FFDC_id(group.get(), &identifier); })) << events;
-      EXPECT_EQ(0, std::memcmp(identifier, group->Hb_ffdc_id, 43));
-      EXPECT_EQ('A', identifier[0]);
-      EXPECT_EQ('k', identifier[42]);
+      struct {
+        Hb_FFDC_Id id;
+        char guard[5];
+      } read;
+      std::memset(&read, 0xEE, sizeof read);
+      EXPECT_TRUE(succeeds([&] { return hb_get_FFDC_id(group.get(), &read.id); })) << events;
+      EXPECT_EQ(0, std::memcmp(read.id, group->Hb_ffdc_id, 43));
+      EXPECT_EQ('A', read.id[0]);
+      EXPECT_EQ('k', read.id[42]);
+      EXPECT_EQ(Bytes(5, '\xEE'), Bytes(read.guard, sizeof read.guard));
     }
   }
 }
@@ -69,22 +75,42 @@ TEST_F(Membership, NoSenderIsToldOfAnotherEventOrType) {
   }
   for (const int type : {0, 1, 3, 4, 5}) {
     make_node_group(256);
-    group->Hb_group_type = static_cast<Hb_Group_Type>(type);
+    set_type(type);
     EXPECT_TRUE(fails_with(3, [&] { return hb_get_different_instance_sender(group.get(), &sender); })) << type;
   }
   EXPECT_EQ(99U, sender.machinesInst);
 }
 
-TEST_F(Membership, ANullGroupOrOutputForTheSenderIsRefused) {
-  make_node_group(256);
-  group->Hb_group_type = Hb_Diff_Instance_Type;
+TEST_F(Membership, ANullGroupOrOutputForTheSenderIsRefusedWhateverTheRecord) {
   Hb_Diff_Instance_Info sender = {};
   EXPECT_TRUE(fails_with(4, [&] { return hb_get_different_instance_sender(nullptr, &sender); }));
-  EXPECT_TRUE(fails_with(4, [&] { return hb_get_different_instance_sender(group.get(), nullptr); }));
+  const std::pair<int, Hb_Events> records[] = {{2, 256}, {2, 4}, {1, 256}};
+  for (const auto& [type, events] : records) {
+    make_node_group(events);
+    set_type(type);
+    EXPECT_TRUE(fails_with(4, [&] { return hb_get_different_instance_sender(group.get(), nullptr); })) << events;
+  }
 }
 
 // The union starts at byte 60 of the group.
 uint8_t* union_of(Hb_Group& group) { return reinterpret_cast<uint8_t*>(&group) + 60; }
+
+TEST_F(Membership, EveryRecordOfSitesAndSplitsStandsAtTheStartOfTheUnion) {
+  auto& members = group->Hb_membership_grp_union;
+  const void* start = union_of(*group);
+  EXPECT_EQ(start, &members.site_split_info);
+  EXPECT_EQ(start, &members.site_merge_info);
+  EXPECT_EQ(start, &members.split_info);
+  EXPECT_EQ(start, &members.merge_info);
+  EXPECT_EQ(136U, sizeof members.site_split_info);
+  EXPECT_EQ(144U, sizeof members.site_merge_info);
+  EXPECT_EQ(164U, sizeof members.split_info);
+  EXPECT_TRUE((std::is_same_v<Hb_Split_Merge_Info, decltype(members.merge_info)>));
+}
+
+TEST(GroupRecord, AGroupIsIdentifiedAsAnAdapterIs) {
+  EXPECT_TRUE((std::is_same_v<Hb_Group_Identifier, Hb_Adapter_Identifier>));
+}
 
 void fill_union(Hb_Group& group) {
   for (size_t index = 0; index < 200; ++index) union_of(group)[index] = static_cast<uint8_t>(index + 1);
@@ -169,12 +195,26 @@ TEST_F(Membership, FieldsOfSitesStandWhereTheyAreSent) {
   EXPECT_EQ(13U, copied(info.subtype));
 }
 
-TEST_F(Membership, ASiteMergeStartsWithTheTwoCounts) {
-  fill_union(*group);
+TEST_F(Membership, ASiteSplitIsTheLocalAndTheRemoteSite) {
+  union_of(*group)[0] = 1;
+  union_of(*group)[68] = 2;
+  Hb_Site_Split_Info info;
+  ASSERT_EQ(Hb_Success, hb_get_site_split_info(group.get(), &info));
+  EXPECT_EQ(1U, copied(info.local_site.node_id.high));
+  EXPECT_EQ(2U, copied(info.remote_site.node_id.high));
+}
+
+TEST_F(Membership, ASiteMergeIsTheTwoCountsThenTheLocalAndTheRemoteSite) {
+  union_of(*group)[0] = 1;
+  union_of(*group)[4] = 2;
+  union_of(*group)[8] = 3;
+  union_of(*group)[76] = 4;
   Hb_Site_Merge_Info info;
   ASSERT_EQ(Hb_Success, hb_get_site_merge_info(group.get(), &info));
-  EXPECT_EQ(0x04030201U, copied(info.num_local_up_nodes));
-  EXPECT_EQ(0x08070605U, copied(info.num_remote_up_nodes));
+  EXPECT_EQ(1U, copied(info.num_local_up_nodes));
+  EXPECT_EQ(2U, copied(info.num_remote_up_nodes));
+  EXPECT_EQ(3U, copied(info.local_site.node_id.high));
+  EXPECT_EQ(4U, copied(info.remote_site.node_id.high));
 }
 
 uint32_t* new_node_numbers() { return static_cast<uint32_t*>(std::malloc(3 * sizeof(uint32_t))); }
@@ -244,17 +284,27 @@ TEST_F(Membership, ANodeIsLookedUpByItsNumberExtendedWithItsSign) {
   EXPECT_EQ(1, reason);
 }
 
+TEST_F(Membership, AConfiguredNodeIsNotTraced) {
+  trace_all();
+  Hb_Entity_State state;
+  Hb_Entity_State_Reason reason;
+  EXPECT_EQ(Hb_Success, hb_get_node_status_reason(3, &state, &reason));
+  EXPECT_THAT(platform_double().traces, IsEmpty());
+}
+
 TEST_F(Membership, AnUnknownNodeFailsWithoutAnErrorNumberAndIsTraced) {
-  trace_only(trace_errors);
-  Hb_Entity_State state = Hb_Entity_Undef;
-  Hb_Entity_State_Reason reason = Hb_Entity_State_Reason_Undef;
-  EXPECT_TRUE(fails_without_error_number([&] { return hb_get_node_status_reason(5, &state, &reason); }));
-  EXPECT_EQ(0, state);
-  EXPECT_EQ(10, reason);
-  ASSERT_EQ(1U, platform_double().traces.size());
-  EXPECT_EQ(315U, platform_double().traces[0].id);
-  EXPECT_EQ(0, platform_double().traces[0].category);
-  EXPECT_THAT(platform_double().traces[0].values, ElementsAre(5));
+  for (const Hb_Node_Number node : {Hb_Node_Number{5}, Hb_Node_Number{-2}}) {
+    trace_only(trace_errors);
+    Hb_Entity_State state = Hb_Entity_Undef;
+    Hb_Entity_State_Reason reason = Hb_Entity_State_Reason_Undef;
+    EXPECT_TRUE(fails_without_error_number([&] { return hb_get_node_status_reason(node, &state, &reason); }));
+    EXPECT_EQ(0, state);
+    EXPECT_EQ(10, reason);
+    ASSERT_EQ(1U, platform_double().traces.size());
+    EXPECT_EQ(315U, platform_double().traces[0].id);
+    EXPECT_EQ(0, platform_double().traces[0].category);
+    EXPECT_THAT(platform_double().traces[0].values, ElementsAre(node == 5 ? 5U : 0xFFFFFFFEU));
+  }
 }
 
 TEST_F(Membership, AnUnknownNodeIsNotTracedWithTheErrorsCategoryOff) {

@@ -34,27 +34,31 @@ TEST(GroupRecord, EventValuesHaveTheirNumbers) {
   EXPECT_EQ(0x7377, HB_EVENT_SUBSCRIBABLE);
 }
 
-TEST_F(Membership, TheIdentityOfANewGroupIsItsLeaderAndItsIncarnation) {
-  make_adapter_group(4);
-  set_leader(13, 0x08000033);
-  EXPECT_TRUE(succeeds([&] { return hb_get_group_id(group.get(), &id); }));
-  EXPECT_EQ(13U, id.Hb_adapter_number);
-  EXPECT_EQ(0x08000033U, id.Hb_incarnation);
+TEST_F(Membership, TheIdentityOfANewGroupIsItsLeaderWhoeverThatIsAndItsIncarnation) {
+  for (const Hb_Adapter_Number leader : {13U, 32U, 98352U, 0xFFFFFFFFU}) {
+    make_adapter_group(4);
+    set_leader(leader, 0x08000033);
+    EXPECT_TRUE(succeeds([&] { return hb_get_group_id(group.get(), &id); })) << leader;
+    EXPECT_TRUE(tells(id, leader, 0x08000033));
+  }
 }
 
-TEST_F(Membership, TheLeaderComesWithItsOwnValueUnmasked) {
-  make_adapter_group(4);
-  set_leader(13, 51);
-  member(13) = 0x08000005;
-  EXPECT_TRUE(succeeds([&] { return hb_get_group_leader_id(group.get(), &id); }));
-  EXPECT_EQ(13U, id.Hb_adapter_number);
-  EXPECT_EQ(0x08000005U, id.Hb_incarnation);
+TEST_F(Membership, TheLeaderComesWithItsOwnValueUnmaskedFromTheWholeList) {
+  const std::pair<Hb_Adapter_Number, Hb_Incarnation> leaders[] = {
+      {13, 0x08000005}, {13, 0xFFFFFFFF}, {32, 0x08000009}, {98351, 0x08000009}};
+  for (const auto& [leader, value] : leaders) {
+    make_adapter_group(4);
+    set_leader(leader, 51);
+    member(leader) = value;
+    EXPECT_TRUE(succeeds([&] { return hb_get_group_leader_id(group.get(), &id); })) << leader;
+    EXPECT_TRUE(tells(id, leader, value));
+  }
 }
 
 TEST_F(Membership, IdentityAndLeaderAreTellingOnlyInAnAdapterGroup) {
-  for (const int type : {0, 2, 3, 4, 5, 6, -1}) {
+  for (const int type : types_but_adapter_group) {
     make_adapter_group(4);
-    group->Hb_group_type = static_cast<Hb_Group_Type>(type);
+    set_type(type);
     EXPECT_TRUE(fails_with(5, [&] { return hb_get_group_id(group.get(), &id); })) << type;
     EXPECT_TRUE(fails_with(5, [&] { return hb_get_group_leader_id(group.get(), &id); })) << type;
     EXPECT_TRUE(untouched(id));
@@ -76,14 +80,16 @@ TEST_F(Membership, TheTypeIsCheckedBeforeTheEvent) {
   EXPECT_TRUE(fails_with(5, [&] { return hb_get_group_leader_id(group.get(), &id); }));
 }
 
-TEST_F(Membership, TheStatusOfANewGroupIsToldWhateverItsType) {
+TEST_F(Membership, TheStatusOfANewGroupIsToldAsItStandsWhateverItsType) {
   for (const int type : {0, 1, 2, 5}) {
-    make_adapter_group(4);
-    group->Hb_group_type = static_cast<Hb_Group_Type>(type);
-    group->Hb_group_status = Hb_Group_Unstable;
-    Hb_Group_Status status = Hb_Group_Stable;
-    EXPECT_TRUE(succeeds([&] { return hb_get_group_status(group.get(), &status); }));
-    EXPECT_EQ(Hb_Group_Unstable, status);
+    for (const int stored : {0, 1, 7}) {
+      make_adapter_group(4);
+      set_type(type);
+      group->Hb_group_status = static_cast<Hb_Group_Status>(stored);
+      auto status = static_cast<Hb_Group_Status>(77);
+      EXPECT_TRUE(succeeds([&] { return hb_get_group_status(group.get(), &status); })) << type;
+      EXPECT_EQ(stored, status);
+    }
   }
 }
 
@@ -110,8 +116,19 @@ TEST_F(Membership, AnAdapterIsToldWithItsValueUnmasked) {
   make_adapter_group(1);
   member(7) = 0x08000005;
   EXPECT_TRUE(succeeds([&] { return hb_get_adapter_id(group.get(), 7, &id); }));
-  EXPECT_EQ(7U, id.Hb_adapter_number);
-  EXPECT_EQ(0x08000005U, id.Hb_incarnation);
+  EXPECT_TRUE(tells(id, 7, 0x08000005));
+}
+
+TEST_F(Membership, MembersAreToldWhateverTheEvent) {
+  for (const Hb_Events events : {0, 1, 2, 4, 8, 128, 512}) {
+    make_adapter_group(events);
+    member(7) = 1;
+    EXPECT_TRUE(succeeds([&] { return hb_get_adapter_id(group.get(), 7, &id); })) << events;
+    EXPECT_EQ(Hb_True, adapter_in_group(group.get(), 7)) << events;
+    make_node_group(events);
+    set_node(3, 1);
+    EXPECT_EQ(1, node_in_group(group.get(), 3)) << events;
+  }
 }
 
 TEST_F(Membership, AnAdapterThatIsNoMemberIsNotTold) {
@@ -132,19 +149,27 @@ TEST_F(Membership, AnAdapterAtTheLimitOfTheClusterIsOutOfRange) {
   EXPECT_TRUE(untouched(id));
 }
 
-TEST_F(Membership, OnlyAnAdapterGroupTellsAnAdapterAndTheNumberIsCheckedFirst) {
-  make_node_group(1);
-  EXPECT_TRUE(fails_with(5, [&] { return hb_get_adapter_id(group.get(), 7, &id); }));
-  EXPECT_TRUE(fails_with(4, [&] { return hb_get_adapter_id(group.get(), 32, &id); }));
-  EXPECT_TRUE(untouched(id));
+TEST_F(Membership, OfAnAdapterTheNumberIsCheckedThenTheTypeThenTheMembership) {
+  for (const int type : types_but_adapter_group) {
+    make_adapter_group(1);
+    member(13) = 1;
+    set_type(type);
+    EXPECT_TRUE(fails_with(4, [&] { return hb_get_adapter_id(group.get(), 32, &id); })) << type;
+    EXPECT_TRUE(fails_with(5, [&] { return hb_get_adapter_id(group.get(), 7, &id); })) << type;
+    EXPECT_TRUE(fails_with(5, [&] { return hb_get_adapter_id(group.get(), 13, &id); })) << type;
+    EXPECT_TRUE(untouched(id));
+  }
 }
 
 TEST_F(Membership, AnAdapterIsInTheGroupWhenItHasAValue) {
   make_adapter_group(2);
   member(0) = 0;
   member(7) = 0x08000005;
-  EXPECT_EQ(Hb_True, adapter_in_group(group.get(), 0));
-  EXPECT_EQ(Hb_True, adapter_in_group(group.get(), 7));
+  member(31) = 1;
+  for (const Hb_Adapter_Number adapter : {0U, 7U, 31U}) {
+    EXPECT_EQ(Hb_True, adapter_in_group(group.get(), adapter)) << adapter;
+    EXPECT_EQ(untouched_error, hb_get_errno());
+  }
   EXPECT_EQ(Hb_False, adapter_in_group(group.get(), 8));
   EXPECT_EQ(untouched_error, hb_get_errno());
 }
@@ -159,11 +184,15 @@ TEST_F(Membership, AnAdapterOutOfRangeIsInNoGroup) {
 }
 
 TEST_F(Membership, AnAdapterIsInNoGroupOfAnotherType) {
-  make_node_group(2);
-  EXPECT_EQ(Hb_False, adapter_in_group(group.get(), 7));
-  EXPECT_EQ(5, hb_get_errno());
-  EXPECT_EQ(Hb_False, adapter_in_group(group.get(), 32));
-  EXPECT_EQ(4, hb_get_errno());
+  for (const int type : types_but_adapter_group) {
+    make_adapter_group(2);
+    member(7) = 1;
+    set_type(type);
+    EXPECT_EQ(Hb_False, adapter_in_group(group.get(), 7)) << type;
+    EXPECT_EQ(5, hb_get_errno()) << type;
+    EXPECT_EQ(Hb_False, adapter_in_group(group.get(), 32)) << type;
+    EXPECT_EQ(4, hb_get_errno()) << type;
+  }
 }
 
 TEST_F(Membership, ANodeInTheGroupIsToldWithTheStoredValue) {
@@ -188,11 +217,15 @@ TEST_F(Membership, ANodeOutOfRangeIsInNoGroup) {
 }
 
 TEST_F(Membership, ANodeIsInNoGroupOfAnotherType) {
-  make_adapter_group(4);
-  EXPECT_EQ(0, node_in_group(group.get(), 3));
-  EXPECT_EQ(5, hb_get_errno());
-  EXPECT_EQ(0, node_in_group(group.get(), 8));
-  EXPECT_EQ(4, hb_get_errno());
+  for (const int type : types_but_node_group) {
+    make_node_group(4);
+    set_node(3, 1);
+    set_type(type);
+    EXPECT_EQ(0, node_in_group(group.get(), 3)) << type;
+    EXPECT_EQ(5, hb_get_errno()) << type;
+    EXPECT_EQ(0, node_in_group(group.get(), 8)) << type;
+    EXPECT_EQ(4, hb_get_errno()) << type;
+  }
 }
 
 TEST_F(Membership, AnIdentifierTellsWhetherTheAdapterWasRemoved) {

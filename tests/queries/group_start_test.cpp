@@ -1,5 +1,5 @@
 // Accessors that start the client, and accessors that work without it.
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
 #include <functional>
 #include <ostream>
@@ -9,6 +9,9 @@
 
 namespace hb_test {
 namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
 
 struct Accessor {
   const char* name;
@@ -49,17 +52,41 @@ const Accessor starting_accessors[] = {
 
 class StartingAccessors : public testing::TestWithParam<Accessor> {
  protected:
-  StartingAccessors() { reset_platform(); }
+  StartingAccessors() {
+    reset_platform();
+    trace_all();
+    std::memset(output, 'x', sizeof output);
+  }
+  ~StartingAccessors() override {
+    trace_nothing();
+    IsVEX = Hb_False;
+  }
+
+  bool output_untouched() const { return Bytes(output, sizeof output) == Bytes(sizeof output, 'x'); }
 
   FakeDaemon daemon;
   std::unique_ptr<Hb_Group> group = std::make_unique<Hb_Group>();
-  alignas(8) char output[64] = {};
+  alignas(8) char output[64];
 };
 
 TEST_P(StartingAccessors, FailAsTheStartDoesWhileNoDaemonIsThere) {
   daemon.stop_listening();
   EXPECT_TRUE(fails_with(15, [&] { return GetParam().call(group.get(), output); }));
-  EXPECT_EQ(Bytes(sizeof output, '\0'), Bytes(output, sizeof output));
+  EXPECT_TRUE(output_untouched());
+  EXPECT_THAT(platform_double().traces_of(310), IsEmpty());
+}
+
+TEST_P(StartingAccessors, FailAsTheStartDoesBeforeTheirPointersAreLookedAt) {
+  daemon.stop_listening();
+  EXPECT_TRUE(fails_with(15, [&] { return GetParam().call(nullptr, nullptr); }));
+}
+
+// The records are those of the start.
+TEST_P(StartingAccessors, FailWithoutAnErrorNumberWhereTheClusterServicesAreAbsent) {
+  IsVEX = Hb_True;
+  EXPECT_TRUE(fails_without_error_number([&] { return GetParam().call(group.get(), output); }));
+  EXPECT_TRUE(output_untouched());
+  EXPECT_THAT(platform_double().trace_ids(), ElementsAre(272, 273, 276));
 }
 
 TEST_P(StartingAccessors, StartTheClientByThemselves) {

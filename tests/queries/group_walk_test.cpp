@@ -61,11 +61,11 @@ TEST_F(Membership, AdaptersAtTheLimitOfTheClusterAreNotWalked) {
 }
 
 TEST_F(Membership, OnlyAnAdapterGroupIsWalkedByAdapter) {
-  for (const int type : {0, 2, 3, 4, 5}) {
+  for (const int type : types_but_adapter_group) {
     make_adapter_group(1);
     member(7) = 1;
     group->Hb_cursor = 3;
-    group->Hb_group_type = static_cast<Hb_Group_Type>(type);
+    set_type(type);
     EXPECT_TRUE(fails_with(5, [&] { return hb_get_first_adapter(group.get(), &id); })) << type;
     EXPECT_TRUE(fails_with(5, [&] { return hb_get_next_adapter(group.get(), &id); })) << type;
     EXPECT_TRUE(untouched(id));
@@ -120,14 +120,44 @@ TEST_F(Membership, NodesAtTheMaximumAreNotWalked) {
 }
 
 TEST_F(Membership, OnlyANodeGroupIsWalkedByNode) {
-  for (const int type : {1, 2, 3, 4, 5}) {
+  for (const int type : types_but_node_group) {
     make_node_group(4);
     set_node(3, 1);
-    group->Hb_group_type = static_cast<Hb_Group_Type>(type);
+    group->Hb_cursor = 3;
+    set_type(type);
     Hb_Node_Number node = 99;
     EXPECT_TRUE(fails_with(5, [&] { return hb_get_first_node(group.get(), &node); })) << type;
     EXPECT_TRUE(fails_with(5, [&] { return hb_get_next_node(group.get(), &node); })) << type;
+    EXPECT_EQ(99, node);
+    EXPECT_EQ(3, group->Hb_cursor);
   }
+}
+
+ConfigurationMessage largest_cluster() { return ConfigurationMessage().max_nodes(2049).adapters_per_node(48); }
+
+TEST_F(Membership, TheLastNodeOfTheLargestClusterIsWalkedAndTold) {
+  reload(largest_cluster());
+  make_node_group(1);
+  set_node(2048, 1);
+  Hb_Node_Number node = 99;
+  EXPECT_TRUE(succeeds([&] { return hb_get_first_node(group.get(), &node); }));
+  EXPECT_EQ(2048, node);
+  EXPECT_EQ(2049, group->Hb_cursor);
+  EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_node(group.get(), &node); }));
+  EXPECT_EQ(-1, node);
+  EXPECT_EQ(1, node_in_group(group.get(), 2048));
+  EXPECT_EQ(untouched_error, hb_get_errno());
+  EXPECT_EQ(0, node_in_group(group.get(), 2049));
+  EXPECT_EQ(4, hb_get_errno());
+}
+
+TEST_F(Membership, TheLastAdapterOfTheLargestClusterIsTold) {
+  reload(largest_cluster());
+  make_adapter_group(1);
+  member(98351) = 3;
+  EXPECT_TRUE(succeeds([&] { return hb_get_adapter_id(group.get(), 98351, &id); }));
+  EXPECT_TRUE(tells(id, 98351, 3));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_adapter_id(group.get(), 98352, &id); }));
 }
 
 struct Expected_Trace {
@@ -161,6 +191,21 @@ TEST_F(Membership, TheEndOfTheAdaptersIsTracedWithTheCursor) {
   trace_only(trace_debug);
   hb_get_first_adapter(group.get(), &id);
   expect_traces({{310, {1, 9}}, {312, {0, 32}}, {313, {9}}});
+}
+
+TEST_F(Membership, ACursorOutsideTheListIsTracedAsItIsAndNothingIsFound) {
+  for (const Hb_Cursor cursor : {-1, 98352}) {
+    make_adapter_group(1);
+    member(7) = 70;
+    group->Hb_cursor = cursor;
+    trace_only(trace_debug);
+    EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_adapter(group.get(), &id); })) << cursor;
+    const std::vector<Recorded_Trace>& traces = platform_double().traces;
+    ASSERT_THAT(platform_double().trace_ids(), ElementsAre(310, 312, 313)) << cursor;
+    EXPECT_THAT(traces[0].values, ElementsAre(1, static_cast<uint32_t>(cursor)));
+    EXPECT_EQ(0U, traces[1].values[0]);
+    EXPECT_THAT(traces[2].values, ElementsAre(static_cast<uint32_t>(cursor)));
+  }
 }
 
 TEST_F(Membership, AGroupOfTheWrongTypeIsTracedWithTheErrorNumber) {

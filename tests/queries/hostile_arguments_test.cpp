@@ -139,26 +139,84 @@ TEST_F(HostileInput, NullPointersToPredicatesMeanNo) {
   set_hb_errno(untouched_error);
   EXPECT_EQ(Hb_False, hb_is_node_in_group(nullptr, 3));
   EXPECT_EQ(4, hb_get_errno());
+  set_hb_errno(untouched_error);
   EXPECT_EQ(3, static_cast<int>(hb_has_adapter_died_because_removed(nullptr)));
+  EXPECT_EQ(4, hb_get_errno());
   EXPECT_EQ(0xFFFFFFFFU, hb_adapter_incarnation(nullptr));
 }
 
-TEST_F(HostileInput, NullPointersToTheSiteAndSplitAccessorsFailThem) {
+TEST_F(HostileInput, NullPointersToTheAccessorsThatDoNotStartTheClientAreRefused) {
   Hb_Site_Split_Info split;
   Hb_Site_Merge_Info merge;
   Hb_Split_Merge_Info info;
   Hb_Group* group = out.group.get();
-  EXPECT_EQ(Hb_Failure, hb_get_site_split_info(nullptr, &split));
-  EXPECT_EQ(Hb_Failure, hb_get_site_split_info(group, nullptr));
-  EXPECT_EQ(Hb_Failure, hb_get_site_merge_info(nullptr, &merge));
-  EXPECT_EQ(Hb_Failure, hb_get_site_merge_info(group, nullptr));
-  EXPECT_EQ(Hb_Failure, hb_get_split_info(nullptr, &info));
-  EXPECT_EQ(Hb_Failure, hb_get_merge_info(group, nullptr));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_site_split_info(nullptr, &split); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_site_split_info(group, nullptr); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_site_merge_info(nullptr, &merge); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_site_merge_info(group, nullptr); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_split_info(nullptr, &info); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_split_info(group, nullptr); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_merge_info(nullptr, &info); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_merge_info(group, nullptr); }));
   hb_free_split_info(nullptr);
   Hb_Entity_State state;
   Hb_Entity_State_Reason reason;
-  EXPECT_EQ(Hb_Failure, hb_get_node_status_reason(3, nullptr, &reason));
-  EXPECT_EQ(Hb_Failure, hb_get_node_status_reason(3, &state, nullptr));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_node_status_reason(3, nullptr, &reason); }));
+  EXPECT_TRUE(fails_with(4, [&] { return hb_get_node_status_reason(3, &state, nullptr); }));
+}
+
+void ask_everything(Hb_Group* group) {
+  Hb_Adapter_Identifier id = {};
+  Hb_Group_Status status;
+  Hb_FFDC_Id identifier;
+  Hb_Diff_Instance_Info sender;
+  Hb_Site_Split_Info split;
+  Hb_Site_Merge_Info merge;
+  Hb_Split_Merge_Info info;
+  Hb_Entity_State state;
+  Hb_Entity_State_Reason reason;
+  hb_get_group_id(group, &id);
+  hb_get_group_leader_id(group, &id);
+  hb_get_group_status(group, &status);
+  hb_get_adapter_id(group, 13, &id);
+  hb_is_adapter_in_group(group, 13);
+  hb_is_node_in_group(group, 3);
+  hb_has_adapter_died_because_removed(&id);
+  hb_adapter_incarnation(&id);
+  hb_get_FFDC_id(group, &identifier);
+  hb_get_different_instance_sender(group, &sender);
+  hb_get_site_split_info(group, &split);
+  hb_get_site_merge_info(group, &merge);
+  hb_get_split_info(group, &info);
+  hb_get_merge_info(group, &info);
+  hb_get_node_status_reason(3, &state, &reason);
+  hb_site_down(group);
+  hb_site_merge(group);
+}
+
+void walk_two_steps(Hb_Group* group) {
+  Hb_Adapter_Identifier id;
+  Hb_Node_Number node;
+  hb_get_first_adapter(group, &id);
+  hb_get_next_adapter(group, &id);
+  hb_get_first_node(group, &node);
+  hb_get_next_node(group, &node);
+}
+
+TEST_F(HostileInput, AccessorsChangeNothingButTheCursorThatTheyWalkWith) {
+  const Bytes adapters = adapter_event_message({{13, 1}, {2, 2}});
+  const std::pair<Bytes, Hb_Cursor> events[] = {
+      {ReplyPacket(4).leader(13, 1).group(13, 2).status(1).message(adapters).bytes(), 14}, {whole_packet(5), 4}};
+  for (const auto& [packet, cursor] : events) {
+    ASSERT_EQ(Hb_Success, deliver(packet));
+    const Bytes before = image_of_state();
+    GroupBytes expected(*out.group);
+    ask_everything(out.group.get());
+    EXPECT_TRUE(expected.is(*out.group)) << cursor;
+    walk_two_steps(out.group.get());
+    EXPECT_TRUE(expected.i32(4, cursor).is(*out.group)) << cursor;
+    EXPECT_TRUE(before == image_of_state()) << cursor;
+  }
 }
 
 }  // namespace

@@ -13,6 +13,10 @@ namespace hb_test {
 // Limit of adapter numbers in the sparse cluster: 4 adapters a node, 8 nodes.
 inline constexpr Hb_Adapter_Number adapter_limit = 32;
 
+// Types of records that are no adapter group, and of those that are no node group.
+inline constexpr int types_but_adapter_group[] = {0, 2, 3, 4, 5, 6, -1};
+inline constexpr int types_but_node_group[] = {1, 2, 3, 4, 5, 6, -1};
+
 class Membership : public Loaded_Client {
  protected:
   ~Membership() override { trace_nothing(); }
@@ -30,6 +34,8 @@ class Membership : public Loaded_Client {
     group->Hb_group_type = Hb_Node_Group;
     group->Hb_events = events;
   }
+
+  void set_type(int type) { group->Hb_group_type = static_cast<Hb_Group_Type>(type); }
 
   Hb_Incarnation& member(Hb_Adapter_Number adapter) {
     return group->Hb_membership_grp_union.Hb_adapter_membership_grp.Hb_adapter_list[adapter];
@@ -51,6 +57,17 @@ class Membership : public Loaded_Client {
 inline bool untouched(const Hb_Adapter_Identifier& id) {
   return id.Hb_adapter_number == 777 && id.Hb_incarnation == 888 &&
          id.Hb_died_because_removed == static_cast<Hb_Boolean>(999);
+}
+
+// Number and incarnation have been written, and the flag has not.
+inline testing::AssertionResult tells(const Hb_Adapter_Identifier& id, Hb_Adapter_Number adapter,
+                                      Hb_Incarnation incarnation) {
+  if (id.Hb_adapter_number == adapter && id.Hb_incarnation == incarnation &&
+      id.Hb_died_because_removed == static_cast<Hb_Boolean>(999)) {
+    return testing::AssertionSuccess();
+  }
+  return testing::AssertionFailure() << "the identifier is " << id.Hb_adapter_number << ", " << id.Hb_incarnation
+                                     << ", " << id.Hb_died_because_removed;
 }
 
 inline Hb_Boolean adapter_in_group(Hb_Group* group, Hb_Adapter_Number adapter) {
