@@ -1,5 +1,5 @@
 // Deaths, joins and new groups of adapters.
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
 #include <ostream>
 
@@ -138,6 +138,22 @@ TEST_F(EventReception, DeathsAndJoinsOfAdaptersAreUnstableWhateverThePacketSays)
     EXPECT_EQ(Hb_Success, deliver(telling_packet(kind).status(0).message(adapter_event_message({{0, 1}}))));
     EXPECT_EQ(1, out.group->Hb_group_status);
   }
+}
+
+TEST_F(EventReception, ADeathBehindAnUpdateReachesTheNewAdapters) {
+  const ConfigurationMessage changed = ConfigurationMessage()
+                                           .max_nodes(3)
+                                           .adapters_per_node(2)
+                                           .adapter(2, "10.2.0.2", 0, "en2", 1)
+                                           .adapter(3, "10.2.0.3", 0, "en3", 1)
+                                           .network("net_changed", "ether");
+  EXPECT_EQ(Hb_Success, deliver(ReplyPacket(9).message(changed.bytes())));
+  EXPECT_EQ(Hb_Success, deliver(ReplyPacket(2).message(adapter_event_message({{3, 30}}))));
+  EXPECT_EQ(1U, adapter_state(2));
+  EXPECT_EQ(2, global_config_tbl.Hb_global_adapter_list[1].Hb_state);
+  const Hb_Incarnation* list = out.group->Hb_membership_grp_union.Hb_adapter_membership_grp.Hb_adapter_list;
+  EXPECT_THAT(std::vector<Hb_Incarnation>(list, list + 7),
+              testing::ElementsAre(0xFFFFFFFF, 0xFFFFFFFF, 0xFFFFFFFF, 30, 0xFFFFFFFF, 0xFFFFFFFF, 0x5A5A5A5A));
 }
 
 }  // namespace

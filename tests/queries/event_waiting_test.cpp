@@ -5,6 +5,7 @@
 #include <thread>
 
 #include "event_reception.h"
+#include "hb_global_data/vex_event_queue.h"
 #include "support/system_calls.h"
 
 namespace hb_test {
@@ -95,6 +96,15 @@ TEST_F(EventReception, AReadThatFailsIsAFailureOfCommunication) {
     EXPECT_TRUE(fails_with(12, [&] { return take(nullptr); })) << error;
   }
   EXPECT_TRUE(out.untouched());
+}
+
+TEST_F(EventReception, TheEventQueueIsNotLookedAtInDaemonMode) {
+  VEX_Event queued = {};
+  event_queue_list = &queued;
+  EXPECT_TRUE(succeeds([&] { return deliver(ReplyPacket(12)); }));
+  EXPECT_EQ(8, out.events);
+  EXPECT_EQ(&queued, event_queue_list);
+  event_queue_list = nullptr;
 }
 
 TEST_F(EventReception, AnEmptyDescriptorArrayFailsWithoutAnErrorNumberAndTakesNothing) {

@@ -50,6 +50,15 @@ TEST_F(HostileInput, AnAnswerThatNobodyAwaitsIsRefusedAtEveryLength) {
   EXPECT_EQ(0x7A, out.events);
 }
 
+TEST_F(HostileInput, AConfigurationThatNobodyAwaitsIsNotLoaded) {
+  const Bytes before = image_of_state();
+  const Bytes answer = ReplyPacket(0).message(sparse_cluster().local_node(1).bytes()).bytes();
+  EXPECT_TRUE(fails_with(10, [&] { return deliver(answer); }));
+  EXPECT_TRUE(before == image_of_state());
+  EXPECT_EQ(0x7A, out.events);
+  EXPECT_EQ('x', out.name[0]);
+}
+
 TEST_F(HostileInput, AFrameOfNegativeLengthFailsTheReceive) {
   for (const int32_t length : {-1, least}) {
     const Bytes before = image_of_state();

@@ -1,6 +1,8 @@
 // Heartbeat settings, failure data, other instances, packets that are no events, and what all events share.
 #include <gmock/gmock.h>
 
+#include <thread>
+
 #include "event_reception.h"
 #include "hb_communication/event_reception.h"
 
@@ -39,6 +41,17 @@ TEST_F(EventReception, AFailureDataIdentifierComesUnderItsOwnName) {
   Hb_FFDC_Id identifier;
   EXPECT_EQ(Hb_Success, hb_get_FFDC_id(out.group.get(), &identifier));
   EXPECT_STREQ("packet's identifier", identifier);
+}
+
+TEST_F(EventReception, AFailureDataIdentifierIsCopiedWithAll43Bytes) {
+  const std::string whole(43, 'f');
+  for (const int32_t kind : {5, 6, 12}) {
+    std::memset(out.group->Hb_ffdc_id, 'o', 43);
+    EXPECT_EQ(Hb_Success,
+              deliver(telling_packet(kind).ffdc(whole).message(node_event_message({1, 0, 0, 0, 0, 0, 0, 0}))));
+    EXPECT_EQ(whole, std::string(out.group->Hb_ffdc_id, 43)) << kind;
+    EXPECT_EQ(0x5A, reinterpret_cast<const char*>(out.group.get())[59]) << kind;
+  }
 }
 
 TEST_F(EventReception, AnotherInstanceIsToldWithItsSender) {
@@ -127,6 +140,21 @@ TEST_F(EventReception, OneCallTakesOneEvent) {
   EXPECT_EQ(2U, out.sequence);
   timeval at_once = {0, 0};
   EXPECT_TRUE(fails_with(2, [&] { return take(&at_once); }));
+}
+
+TEST_F(EventReception, AFrameLongerThanAnyPacketIsTakenAsSent) {
+  constexpr size_t longest_packet = 6298816;
+  const Bytes message(longest_packet, 'm');
+  std::thread sender([&] {
+    connection.send_frame(ReplyPacket(12).message(message).sequence(1).bytes());
+    connection.send_frame(ReplyPacket(12).sequence(2).bytes());
+  });
+  EXPECT_TRUE(succeeds([&] { return take(); }));
+  EXPECT_EQ(8, out.events);
+  EXPECT_EQ(1U, out.sequence);
+  EXPECT_TRUE(succeeds([&] { return take(); }));
+  EXPECT_EQ(2U, out.sequence);
+  sender.join();
 }
 
 TEST_F(EventReception, ANewAdapterGroupAnswersTheAccessors) {

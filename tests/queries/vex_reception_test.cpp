@@ -2,12 +2,16 @@
 #include <gmock/gmock.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <cstring>
+#include <functional>
+#include <memory>
 
 #include "VEX_EVMONEventPipeHandler.h"
 #include "event_outputs.h"
 #include "hb_global_data/vex_event_queue.h"
 #include "platform_doubles.h"
+#include "support/system_calls.h"
 #include "test_cluster.h"
 
 namespace hb_test {
@@ -23,6 +27,7 @@ class Scripted_Pipe_Handler : public EVMONEventPipeHandler {
 
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override {
     ++calls;
+    on_call();
     *events = 64;
     std::memcpy(name, "from the queue", 15);
     group->Hb_group_type = Hb_Site_Group;
@@ -32,6 +37,7 @@ class Scripted_Pipe_Handler : public EVMONEventPipeHandler {
 
   int calls = 0;
   Hb_Rc result = Hb_Success;
+  std::function<void()> on_call = [] {};
 };
 
 class VexReception : public testing::Test {
@@ -115,6 +121,50 @@ TEST_F(VexReception, TheHandlersFailureIsHandedOn) {
   handler->result = Hb_Failure;
   EXPECT_TRUE(fails_without_error_number([&] { return take(999); }));
   EXPECT_EQ(1, handler->calls);
+}
+
+TEST_F(VexReception, TheTimeLimitIsNotWaitedFor) {
+  make_handler();
+  event_queue_list = &event;
+  SystemCalls calls;
+  int descriptors[] = {999, -1};
+  timeval at_once = {0, 0};
+  EXPECT_TRUE(succeeds([&] {
+    return hb_get_event_message(descriptors, &at_once, &out.events, out.name, out.group.get(), &out.sequence);
+  }));
+  EXPECT_EQ(64, out.events);
+  EXPECT_THAT(calls.of("select"), IsEmpty());
+}
+
+TEST_F(VexReception, TheSystemErrorIsKeptWhateverTracingDoesToIt) {
+  trace_all();
+  platform_double().errno_after_trace = EPERM;
+  errno = EXDEV;
+  take(0);
+  EXPECT_EQ(EXDEV, errno) << "without a handler";
+  make_handler();
+  errno = EXDEV;
+  take(999);
+  EXPECT_EQ(EXDEV, errno) << "with an empty queue";
+  event_queue_list = &event;
+  take(999);
+  EXPECT_EQ(EXDEV, errno) << "with an event in the queue";
+  platform_double().errno_after_trace = 0;
+}
+
+TEST_F(VexReception, TheQueueIsLookedAtUnderItsMutexWhichIsFreeWhenTheEventIsDelivered) {
+  make_handler();
+  event_queue_list = &event;
+  SystemCalls calls;
+  calls.only("pthread_mutex_lock", 0, &event_queue_list_and_sequence_mutex);
+  calls.only("pthread_mutex_unlock", 0, &event_queue_list_and_sequence_mutex);
+  handler->on_call = [&] {
+    EXPECT_EQ(1U, calls.of("pthread_mutex_lock").size());
+    EXPECT_EQ(1U, calls.of("pthread_mutex_unlock").size());
+  };
+  EXPECT_TRUE(succeeds([&] { return take(999); }));
+  EXPECT_EQ(1, handler->calls);
+  EXPECT_EQ(1U, calls.of("pthread_mutex_lock").size());
 }
 
 TEST_F(VexReception, NothingIsTracedWithTheCategoriesOff) {
