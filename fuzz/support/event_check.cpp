@@ -162,11 +162,12 @@ void Event_Check::apply_adapter_event(Bytes packet) {
   std::memset(members.Hb_adapter_list, 0xFF, 4 * size_t{limit});
   for (int64_t i = 0; i <= last_index; ++i) {
     const auto entry = field<hb_adapter_event_entry>(message, 4 + 8 * static_cast<size_t>(i));
-    if (entry.adapter < HB_MAX_ADAPTERS) {
-      members.Hb_adapter_list[entry.adapter] = entry.incarnation;
-      if (entry.adapter >= limit) {
-        beyond_limit_.push_back(entry.adapter);
-      }
+    if (entry.adapter >= HB_MAX_ADAPTERS) {
+      continue;
+    }
+    members.Hb_adapter_list[entry.adapter] = entry.incarnation;
+    if (entry.adapter >= limit) {
+      beyond_limit_.push_back(entry.adapter);
     }
     changed_adapters_.push_back(entry.adapter);
     if (Hb_Adapter* adapter = model_.find(entry.adapter)) {
