@@ -44,6 +44,10 @@ TEST(State, IsEmptyAndInDaemonModeBeforeTheFirstStart) {
   EXPECT_EQ(global_config_tbl_new.adap_hash, nullptr);
   EXPECT_EQ(global_num_nodes, 0);
   EXPECT_EQ(global_num_sites, 0);
+  EXPECT_STREQ(nodeEventSubscriptionName, "");
+  EXPECT_STREQ(networkEventSubscriptionName, "");
+  EXPECT_STREQ(siteEventSubscriptionName, "");
+  EXPECT_STREQ(splitMergeEventSubscriptionName, "");
 }
 
 TEST(State, HasNoMonitorHandlerBeforeTheFirstStart) {

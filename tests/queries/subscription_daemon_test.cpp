@@ -2,9 +2,8 @@
 #include <gmock/gmock.h>
 #include <unistd.h>
 
-#include "platform_doubles.h"
-#include "subscription_record.h"
 #include "support/running_client.h"
+#include "vex_subscription.h"
 
 namespace hb_test {
 namespace {
@@ -12,9 +11,11 @@ namespace {
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-class DaemonSubscription : public RunningClient {
+class DaemonSubscription : public RunningClient, protected NewGroupHandler {
  protected:
-  DaemonSubscription() : RunningClient(sparse_cluster()) {
+  DaemonSubscription() : RunningClient(sparse_cluster()) { forget_names(); }
+
+  static void forget_names() {
     for (char* slot : {nodeEventSubscriptionName, networkEventSubscriptionName, siteEventSubscriptionName,
                        splitMergeEventSubscriptionName}) {
       std::memset(slot, 0, 32);
@@ -34,6 +35,14 @@ class DaemonSubscription : public RunningClient {
     EXPECT_EQ(record_size, u32_at(request, 12));
     EXPECT_EQ(static_cast<uint32_t>(getpid()), u32_at(request, 64));
     return request.substr(76);
+  }
+
+  // The type that a group of that type and count, without members, is sent as.
+  uint32_t sent_type(int32_t type, int32_t count) {
+    Hb_Subscription_Group group = group_of_type(type);
+    set_count(group, count);
+    EXPECT_TRUE(succeeds([&] { return subscribe(group); })) << type;
+    return u32_at(subscribed_record(), 0);
   }
 };
 
@@ -101,11 +110,43 @@ TEST_F(DaemonSubscription, AGroupOfAllNodesButOneIsSentAsItIs) {
   EXPECT_EQ(0U, u32_at(subscribed_record(), 0));
 }
 
-TEST_F(DaemonSubscription, ANetworkOfEveryAdapterIsSentAsANetwork) {
-  Hb_Subscription_Group group = group_of_type(5);
-  set_count(group, 5);
+TEST_F(DaemonSubscription, ItsCountMakesAGroupAllWhateverItsMembers) {
+  EXPECT_EQ(3U, sent_type(2, 5));
+  EXPECT_EQ(1U, sent_type(0, 3));
+  Hb_Subscription_Group group = group_of_type(4);
+  hb_add_all_adapters_to_subscription_group(&group);
+  set_count(group, 4);
   EXPECT_TRUE(succeeds([&] { return subscribe(group); }));
-  EXPECT_EQ(5U, u32_at(subscribed_record(), 0));
+  EXPECT_EQ(2U, u32_at(subscribed_record(), 0));
+}
+
+TEST_F(DaemonSubscription, AllNodesAreAsManyAsTheNodeCountSays) {
+  global_num_nodes = 7;
+  EXPECT_EQ(1U, sent_type(0, 7));
+  EXPECT_EQ(0U, sent_type(0, 3));
+}
+
+TEST_F(DaemonSubscription, ANetworkOfEveryAdapterIsSentAsANetwork) { EXPECT_EQ(5U, sent_type(5, 5)); }
+
+TEST_F(DaemonSubscription, ATypeThatNoGroupHasIsSentAsItIsAndKept) {
+  for (const int32_t type : odd_types) {
+    Hb_Subscription_Group group = group_of_type(type);
+    EXPECT_TRUE(succeeds([&] { return subscribe(group); })) << type;
+    EXPECT_EQ(type, i32_at(subscribed_record(), 0));
+    EXPECT_EQ(type, group.Hb_subscription_type);
+  }
+}
+
+TEST_F(DaemonSubscription, AGroupMayBeChangedAndRegisteredAgain) {
+  Hb_Subscription_Group group = group_of_type(4);
+  hb_add_node_to_subscription_group(&group, 3);
+  EXPECT_TRUE(succeeds([&] { return subscribe(group); }));
+  subscribed_record();
+  hb_add_node_to_subscription_group(&group, 4);
+  EXPECT_TRUE(succeeds([&] { return subscribe(group); }));
+  const Bytes record = subscribed_record();
+  EXPECT_EQ(2U, u32_at(record, 48));
+  EXPECT_EQ('\x18', record[52]);
 }
 
 TEST_F(DaemonSubscription, SiteEventsAreSentAsAllSitesAndLeaveTheSiteType) {
@@ -145,12 +186,14 @@ TEST_F(DaemonSubscription, ARefusedSubscriptionSendsNothing) {
   EXPECT_FALSE(connection.has_input());
 }
 
-TEST_F(DaemonSubscription, ADaemonThatIsGoneFailsTheCallAndTheTypeIsPutBack) {
+TEST_F(DaemonSubscription, ADaemonThatIsGoneFailsTheCallAndNameAndEventsStandAndTheTypeIsPutBack) {
   connection.close();
   Hb_Subscription_Group group = group_of_type(4);
   hb_add_all_adapters_to_subscription_group(&group);
   EXPECT_TRUE(fails_with(16, [&] { return subscribe(group); }));
   EXPECT_EQ(2, group.Hb_subscription_type);
+  EXPECT_STREQ("follower", group.Hb_name);
+  EXPECT_EQ(1, group.Hb_events);
   EXPECT_TRUE(fails_with(16, [&] { return subscribe(group, 0x60); }));
   EXPECT_EQ(7, group.Hb_subscription_type);
   char name[] = "follower";
@@ -158,15 +201,31 @@ TEST_F(DaemonSubscription, ADaemonThatIsGoneFailsTheCallAndTheTypeIsPutBack) {
 }
 
 TEST_F(DaemonSubscription, ANameIsKeptByKindInDaemonModeToo) {
-  Hb_Subscription_Group group = group_of_type(5);
-  subscribe(group);
-  EXPECT_THAT(names(), ElementsAre("", "follower", "", ""));
-  group = group_of_type(0);
-  subscribe(group);
-  EXPECT_THAT(names(), ElementsAre("follower", "follower", "", ""));
+  const std::vector<std::string> node = {"follower", "", "", ""};
+  const std::vector<std::string> network = {"", "follower", "", ""};
+  const std::vector<std::string> site = {"", "", "follower", ""};
+  const std::vector<std::string> split_merge = {"", "", "", "follower"};
+  const std::vector<std::string> none(4);
+  const std::vector<std::string> kept[] = {node, node, network, network, none, network, none, site, site, split_merge};
+  for (int32_t type = 0; type <= 9; ++type) {
+    forget_names();
+    Hb_Subscription_Group group = group_of_type(type);
+    subscribe(group);
+    if (type != 4) subscribed_record();
+    EXPECT_EQ(kept[type], names()) << type;
+  }
 }
 
-TEST_F(DaemonSubscription, NoNewGroupHandlerIsNeededOrWritten) {
+TEST_F(DaemonSubscription, ANewGroupHandlerIsNotWritten) {
+  make_pipe_handler();
+  for (const int32_t type : {0, 2}) {
+    Hb_Subscription_Group group = group_of_type(type);
+    EXPECT_TRUE(succeeds([&] { return subscribe(group); })) << type;
+    EXPECT_THAT(bytes_written(), IsEmpty()) << type;
+  }
+}
+
+TEST_F(DaemonSubscription, NoNewGroupHandlerIsNeeded) {
   trace_all();
   Hb_Subscription_Group group = group_of_type(0);
   EXPECT_TRUE(succeeds([&] { return subscribe(group); }));

@@ -5,6 +5,7 @@
 
 #include <cstdint>
 #include <cstring>
+#include <limits>
 #include <string>
 #include <vector>
 
@@ -15,6 +16,9 @@ namespace hb_test {
 inline constexpr size_t count_offset = 48;
 inline constexpr size_t set_offset = 52;
 inline constexpr size_t record_size = 12348;
+
+// Types that no group has, as a caller may leave them in a record.
+inline constexpr int32_t odd_types[] = {10, -1, std::numeric_limits<int32_t>::max()};
 
 inline Hb_Subscription_Group group_filled_with(uint8_t byte, int32_t type) {
   Hb_Subscription_Group group;
@@ -56,6 +60,14 @@ inline std::vector<size_t> members_of(const Hb_Subscription_Group& group, size_t
 
 inline bool same_bytes(const Hb_Subscription_Group& left, const Hb_Subscription_Group& right) {
   return std::memcmp(&left, &right, sizeof left) == 0;
+}
+
+// A group that was filled with 0xFF, and of which at most type and members were written since.
+inline void expect_header_untouched(const Hb_Subscription_Group& group) {
+  EXPECT_EQ(-1, group.Hb_cursor);
+  EXPECT_EQ(-1, group.Hb_events);
+  EXPECT_THAT(group.Hb_name, testing::Each('\xFF'));
+  EXPECT_EQ(-1, group.Hb_netnum);
 }
 
 inline void configure_sites(const std::vector<bool>& configured) {

@@ -52,22 +52,36 @@ const Group_Function functions_that_start[] = {
 
 std::string name_of_function(const testing::TestParamInfo<Group_Function>& test) { return test.param.name; }
 
-class EveryGroupFunction : public testing::TestWithParam<Group_Function> {};
+class EveryGroupFunction : public testing::TestWithParam<Group_Function> {
+ protected:
+  // It fails with that error, and neither the group nor an output is written.
+  static void expect_start_fails(int error) {
+    Hb_Subscription_Group group = group_filled_with(0x3C, 4);
+    const Hb_Subscription_Group before = group;
+    adapter_output = 77;
+    node_output = 77;
+    site_output = 77;
+    EXPECT_TRUE(fails_with(error, [&] { return GetParam().call(&group); }));
+    EXPECT_TRUE(same_bytes(before, group));
+    EXPECT_EQ(77U, adapter_output);
+    EXPECT_EQ(77, node_output);
+    EXPECT_EQ(77, site_output);
+  }
+};
 
 TEST_P(EveryGroupFunction, FailsAsTheStartDoesWhileNoDaemonIsThere) {
   reset_platform();
   FakeDaemon daemon;
   daemon.stop_listening();
-  Hb_Subscription_Group group = group_filled_with(0x3C, 4);
-  const Hb_Subscription_Group before = group;
-  adapter_output = 77;
-  node_output = 77;
-  site_output = 77;
-  EXPECT_TRUE(fails_with(15, [&] { return GetParam().call(&group); }));
-  EXPECT_TRUE(same_bytes(before, group));
-  EXPECT_EQ(77U, adapter_output);
-  EXPECT_EQ(77, node_output);
-  EXPECT_EQ(77, site_output);
+  expect_start_fails(15);
+}
+
+TEST_P(EveryGroupFunction, FailsAsTheStartDoesWithoutTheServicesOfVexMode) {
+  reset_platform();
+  IsVEX = Hb_True;
+  expect_start_fails(untouched_error);
+  EXPECT_EQ(1, platform_double().boot_addrs.calls);
+  IsVEX = Hb_False;
 }
 
 TEST_P(EveryGroupFunction, StartsTheClientByItself) {

@@ -1,6 +1,8 @@
 // Walking the members of a subscription group.
 #include <gmock/gmock.h>
 
+#include <iterator>
+
 #include "subscription_record.h"
 
 namespace hb_test {
@@ -45,10 +47,10 @@ TEST_F(Subscription, SitesAreWalkedAscendingToTheEnd) {
   Hb_Subscription_Group group = group_of_type(4);
   hb_add_all_sites_to_subscription_group(&group);
   Hb_Site_Number site = 99;
-  EXPECT_EQ(Hb_Success, hb_get_first_subscription_site(&group, &site));
+  EXPECT_TRUE(succeeds([&] { return hb_get_first_subscription_site(&group, &site); }));
   EXPECT_EQ(0, site);
   EXPECT_EQ(1, group.Hb_cursor);
-  EXPECT_EQ(Hb_Success, hb_get_next_subscription_site(&group, &site));
+  EXPECT_TRUE(succeeds([&] { return hb_get_next_subscription_site(&group, &site); }));
   EXPECT_EQ(1, site);
   EXPECT_EQ(2, group.Hb_cursor);
   EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_subscription_site(&group, &site); }));
@@ -73,7 +75,7 @@ TEST_F(Subscription, AFirstCallStartsAgainWhateverTheCursor) {
   hb_add_all_adapters_to_subscription_group(&group);
   group.Hb_cursor = 1000;
   Hb_Adapter_Number adapter = 99;
-  EXPECT_EQ(Hb_Success, hb_get_first_subscription_adapter(&group, &adapter));
+  EXPECT_TRUE(succeeds([&] { return hb_get_first_subscription_adapter(&group, &adapter); }));
   EXPECT_EQ(0U, adapter);
 }
 
@@ -91,7 +93,7 @@ TEST_F(Subscription, MembersAtTheBoundOfTheClusterAreNotWalked) {
   set_member(adapters, 31);
   set_member(adapters, 32);
   Hb_Adapter_Number adapter = 0;
-  EXPECT_EQ(Hb_Success, hb_get_first_subscription_adapter(&adapters, &adapter));
+  EXPECT_TRUE(succeeds([&] { return hb_get_first_subscription_adapter(&adapters, &adapter); }));
   EXPECT_EQ(31U, adapter);
   EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_subscription_adapter(&adapters, &adapter); }));
 
@@ -99,7 +101,7 @@ TEST_F(Subscription, MembersAtTheBoundOfTheClusterAreNotWalked) {
   set_member(nodes, 7);
   set_member(nodes, 8);
   Hb_Node_Number node = 0;
-  EXPECT_EQ(Hb_Success, hb_get_first_subscription_node(&nodes, &node));
+  EXPECT_TRUE(succeeds([&] { return hb_get_first_subscription_node(&nodes, &node); }));
   EXPECT_EQ(7, node);
   EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_subscription_node(&nodes, &node); }));
 
@@ -109,14 +111,51 @@ TEST_F(Subscription, MembersAtTheBoundOfTheClusterAreNotWalked) {
   EXPECT_TRUE(fails_with(1, [&] { return hb_get_first_subscription_site(&sites, &site); }));
 }
 
-std::vector<size_t> walked_adapters(Hb_Subscription_Group& group) {
+template <typename Number>
+using Walk_Function = Hb_Rc (*)(Hb_Subscription_Group*, Number*);
+
+template <typename Number>
+std::vector<size_t> walked_by(Walk_Function<Number> first, Walk_Function<Number> next, Hb_Subscription_Group& group) {
   std::vector<size_t> walked;
-  Hb_Adapter_Number adapter = 0;
-  for (Hb_Rc rc = hb_get_first_subscription_adapter(&group, &adapter); rc == Hb_Success;
-       rc = hb_get_next_subscription_adapter(&group, &adapter)) {
-    walked.push_back(adapter);
-  }
+  Number member = 0;
+  for (Hb_Rc rc = first(&group, &member); rc == Hb_Success; rc = next(&group, &member)) walked.push_back(member);
   return walked;
+}
+
+std::vector<size_t> walked_adapters(Hb_Subscription_Group& group) {
+  return walked_by(hb_get_first_subscription_adapter, hb_get_next_subscription_adapter, group);
+}
+
+TEST_F(Subscription, AllEightSitesAreWalkedAndNoMore) {
+  for (const int max_sites : {8, 100}) {
+    global_config_tbl.Hb_max_sites = max_sites;
+    Hb_Subscription_Group group = group_filled_with(0xFF, 7);
+    EXPECT_THAT(walked_by(hb_get_first_subscription_site, hb_get_next_subscription_site, group),
+                ElementsAre(0, 1, 2, 3, 4, 5, 6, 7))
+        << max_sites;
+    Hb_Site_Number site = 99;
+    EXPECT_TRUE(fails_with(1, [&] { return hb_get_next_subscription_site(&group, &site); })) << max_sites;
+    EXPECT_EQ(65535, site);
+  }
+}
+
+template <typename Number>
+void expect_cursor_alone_written(Walk_Function<Number> first, Walk_Function<Number> next, int32_t type) {
+  Hb_Subscription_Group group = group_filled_with(0xFF, type);
+  Hb_Subscription_Group expected = group;
+  Number member = 99;
+  EXPECT_TRUE(succeeds([&] { return first(&group, &member); })) << type;
+  expected.Hb_cursor = 1;
+  EXPECT_TRUE(same_bytes(expected, group)) << type;
+  EXPECT_TRUE(succeeds([&] { return next(&group, &member); })) << type;
+  expected.Hb_cursor = 2;
+  EXPECT_TRUE(same_bytes(expected, group)) << type;
+}
+
+TEST_F(Subscription, AWalkWritesNothingButTheCursor) {
+  expect_cursor_alone_written(hb_get_first_subscription_adapter, hb_get_next_subscription_adapter, 2);
+  expect_cursor_alone_written(hb_get_first_subscription_node, hb_get_next_subscription_node, 0);
+  expect_cursor_alone_written(hb_get_first_subscription_site, hb_get_next_subscription_site, 7);
 }
 
 TEST_F(Subscription, MembersFarApartAreWalkedWhereverTheyLieInTheirBytes) {
@@ -151,38 +190,35 @@ TEST_F(Subscription, MembersAreWalkedWithoutAskingTheConfiguration) {
   Hb_Subscription_Group group = group_of_type(2);
   set_member(group, 1);
   Hb_Adapter_Number adapter = 0;
-  EXPECT_EQ(Hb_Success, hb_get_first_subscription_adapter(&group, &adapter));
+  EXPECT_TRUE(succeeds([&] { return hb_get_first_subscription_adapter(&group, &adapter); }));
   EXPECT_EQ(1U, adapter);
 }
 
-TEST_F(Subscription, OnlyAGroupOfAdaptersIsWalkedByAdapter) {
-  for (int32_t type = 0; type <= 9; ++type) {
-    if (type == 2) continue;
+template <typename Number>
+void expect_walked_alone(Walk_Function<Number> first, Walk_Function<Number> next, int32_t walked_type) {
+  std::vector<int32_t> types(std::begin(odd_types), std::end(odd_types));
+  for (int32_t type = 0; type <= 9; ++type) types.push_back(type);
+  for (const int32_t type : types) {
+    if (type == walked_type) continue;
     Hb_Subscription_Group group = group_filled_with(0xFF, type);
-    Hb_Adapter_Number adapter = 99;
-    EXPECT_TRUE(fails_with(11, [&] { return hb_get_first_subscription_adapter(&group, &adapter); })) << type;
-    EXPECT_TRUE(fails_with(11, [&] { return hb_get_next_subscription_adapter(&group, &adapter); })) << type;
-    EXPECT_EQ(-1, group.Hb_cursor);
+    const Hb_Subscription_Group before = group;
+    Number member = 99;
+    EXPECT_TRUE(fails_with(11, [&] { return first(&group, &member); })) << type;
+    EXPECT_TRUE(fails_with(11, [&] { return next(&group, &member); })) << type;
+    EXPECT_TRUE(same_bytes(before, group)) << type;
   }
+}
+
+TEST_F(Subscription, OnlyAGroupOfAdaptersIsWalkedByAdapter) {
+  expect_walked_alone(hb_get_first_subscription_adapter, hb_get_next_subscription_adapter, 2);
 }
 
 TEST_F(Subscription, OnlyAGroupOfNodesIsWalkedByNode) {
-  for (int32_t type = 1; type <= 9; ++type) {
-    Hb_Subscription_Group group = group_filled_with(0xFF, type);
-    Hb_Node_Number node = 99;
-    EXPECT_TRUE(fails_with(11, [&] { return hb_get_first_subscription_node(&group, &node); })) << type;
-    EXPECT_TRUE(fails_with(11, [&] { return hb_get_next_subscription_node(&group, &node); })) << type;
-  }
+  expect_walked_alone(hb_get_first_subscription_node, hb_get_next_subscription_node, 0);
 }
 
 TEST_F(Subscription, OnlyAGroupOfSitesIsWalkedBySite) {
-  for (int32_t type = 0; type <= 9; ++type) {
-    if (type == 7) continue;
-    Hb_Subscription_Group group = group_filled_with(0xFF, type);
-    Hb_Site_Number site = 99;
-    EXPECT_TRUE(fails_with(11, [&] { return hb_get_first_subscription_site(&group, &site); })) << type;
-    EXPECT_TRUE(fails_with(11, [&] { return hb_get_next_subscription_site(&group, &site); })) << type;
-  }
+  expect_walked_alone(hb_get_first_subscription_site, hb_get_next_subscription_site, 7);
 }
 
 TEST_F(Subscription, ANullOutputIsRefused) {

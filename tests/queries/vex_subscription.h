@@ -1,10 +1,11 @@
-// Subscriptions in VEX mode, with a new-group handler on a real pipe.
+// A new-group handler on a real pipe, and subscriptions in VEX mode.
 #pragma once
 
 #include <fcntl.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <memory>
 
 #include "VEX_EVMONNewGroupEventHandler.h"
@@ -13,17 +14,10 @@
 
 namespace hb_test {
 
-class VexSubscription : public Subscription {
+class NewGroupHandler {
  protected:
-  VexSubscription() {
-    IsVEX = Hb_True;
-    for (Hb_Name* slot : slots) set_name(*slot, "");
-  }
-  ~VexSubscription() override {
-    remove_handler();
-    IsVEX = Hb_False;
-    trace_nothing();
-  }
+  NewGroupHandler() = default;
+  ~NewGroupHandler() { remove_handler(); }
 
   // A new-group handler that writes to `write_end`. It owns both descriptors.
   void make_handler(int read_end, int write_end) {
@@ -52,6 +46,30 @@ class VexSubscription : public Subscription {
     return {bytes, bytes + std::max<ssize_t>(count, 0)};
   }
 
+  std::unique_ptr<EVMONNewGroupEventHandler> handler;
+
+ private:
+  int read_end_ = -1;
+};
+
+class VexSubscription : public Subscription, protected NewGroupHandler {
+ protected:
+  VexSubscription() {
+    IsVEX = Hb_True;
+    for (Hb_Name* slot : slots) set_name(*slot, "");
+  }
+  ~VexSubscription() override {
+    IsVEX = Hb_False;
+    platform_double().errno_after_trace = 0;
+    trace_nothing();
+  }
+
+  // Switches tracing on, each record of which leaves another errno.
+  static void trace_and_spoil_errno() {
+    trace_only(trace_info);
+    platform_double().errno_after_trace = EPERM;
+  }
+
   Hb_Rc subscribe(int32_t type, int events = 1) {
     Hb_Subscription_Group group = group_of_type(type);
     set_count(group, 1);
@@ -59,12 +77,8 @@ class VexSubscription : public Subscription {
     return hb_subscribe(name, &group, events);
   }
 
-  std::unique_ptr<EVMONNewGroupEventHandler> handler;
   Hb_Name* slots[4] = {&nodeEventSubscriptionName, &networkEventSubscriptionName, &siteEventSubscriptionName,
                        &splitMergeEventSubscriptionName};
-
- private:
-  int read_end_ = -1;
 };
 
 }  // namespace hb_test
