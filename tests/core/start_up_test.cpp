@@ -104,6 +104,15 @@ TEST_F(StartUp, ClearsAllButTheLastByteOfTheTwoSubscriptionNames) {
   EXPECT_EQ(std::string(networkEventSubscriptionName, 32), std::string(31, '\0') + 'w');
 }
 
+TEST_F(StartUp, LeavesTheNamesOfSiteAndSplitMergeSubscriptions) {
+  FakeDaemon daemon;
+  std::memset(siteEventSubscriptionName, 's', 32);
+  std::memset(splitMergeEventSubscriptionName, 'm', 32);
+  const DaemonConnection connection = start_client(daemon, small_cluster());
+  EXPECT_EQ(std::string(siteEventSubscriptionName, 32), std::string(32, 's'));
+  EXPECT_EQ(std::string(splitMergeEventSubscriptionName, 32), std::string(32, 'm'));
+}
+
 TEST_F(StartUp, ThatFailsStillRegistersTraceAndClearsTheNames) {
   FakeDaemon daemon(Publication::none());
   daemon.stop_listening();
