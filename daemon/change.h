@@ -2,6 +2,7 @@
 #ifndef HBD_CHANGE_H
 #define HBD_CHANGE_H
 
+#include <optional>
 #include <string>
 #include <variant>
 #include <vector>
@@ -68,8 +69,60 @@ struct HeartbeatSettings {
   std::int32_t daemon_pid = 0;
 };
 
+/** Adapters stop working, and nobody has noticed yet. */
+struct AdapterSilence {
+  std::vector<Hb_Adapter_Number> adapters;
+};
+
+/** Somebody has reported adapters down, and is believed. */
+struct ReportedDeath {
+  std::vector<Hb_Adapter_Number> adapters;
+};
+
+/** The time in which suspected adapters could give a sign of life is over. */
+struct SuspicionEnd {
+  std::vector<Hb_Adapter_Number> adapters;
+};
+
+/** An adapter is watched, or not any more. */
+struct MonitoringSwitch {
+  Hb_Adapter_Number adapter = 0;
+  bool on = true;
+};
+
+/** An adapter's interface is switched on or off. */
+struct InterfaceSwitch {
+  Hb_Adapter_Number adapter = 0;
+  bool on = true;
+};
+
+/** A time begins or ends in which an adapter's silence is no death. */
+struct GraceSwitch {
+  Hb_Adapter_Number adapter = 0;
+  bool on = true;
+};
+
+/** The monitors of an interface of the local node change no state by themselves, or do so again. */
+struct ManualControl {
+  std::string interface;
+  bool on = true;
+};
+
+/** An adapter gets another address, or loses the one that it has. */
+struct NewAddress {
+  Hb_Adapter_Number adapter = 0;
+  std::optional<Hb_IP_address6> address;
+};
+
+/** The configuration changes: adapters have other addresses. */
+struct AddressChange {
+  std::vector<NewAddress> addresses;
+};
+
 using Change = std::variant<AdapterDeath, AdapterJoin, NodeDeath, NodeJoin, NetworkLoss, NetworkReturn,
-                            ConfigurationChange, FailureData, DifferentInstance, HeartbeatSettings>;
+                            ConfigurationChange, FailureData, DifferentInstance, HeartbeatSettings, AdapterSilence,
+                            ReportedDeath, SuspicionEnd, MonitoringSwitch, InterfaceSwitch, GraceSwitch, ManualControl,
+                            AddressChange>;
 
 /** Takes changes from a membership source. */
 class ChangeSink {

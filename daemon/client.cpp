@@ -19,12 +19,12 @@ Client::Client(Loop& loop, Descriptor socket, std::string label, ClientOwner& ow
   poll_.watch(UV_READABLE);
 }
 
-void Client::send(SharedFrame frame, const SubscriptionName& name) {
+void Client::push(SharedFrame frame, const SubscriptionName& name, OutputQueue::Time told_at) {
   if (!connected()) {
     return;
   }
   const bool was_behind = is_behind();
-  const auto result = output_.push(socket_.get(), std::move(frame), name, owner_.queue_bound());
+  const auto result = output_.push(socket_.get(), std::move(frame), name, owner_.queue_bound(), told_at);
   if (result == OutputQueue::Result::Kept && !was_behind) {
     last_progress_ = loop_.now();
     poll_.watch(UV_READABLE | UV_WRITABLE);
@@ -85,7 +85,17 @@ void Client::take_requests() {
   }
 }
 
+void Client::drop_stale() {
+  const std::size_t dropped = output_.drop_told_before(loop_.now() - owner_.stale_age());
+  if (dropped != 0) {
+    spdlog::debug("{}: {} events were stale before it read them; dropped", label_, dropped);
+  }
+}
+
 void Client::flush() {
+  if (discards_stale) {
+    drop_stale();
+  }
   const std::size_t before = output_.size();
   const auto result = output_.flush(socket_.get());
   if (output_.size() != before) {

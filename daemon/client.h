@@ -4,6 +4,7 @@
 
 #include <chrono>
 #include <string>
+#include <utility>
 
 #include "descriptor.h"
 #include "frame_reader.h"
@@ -29,6 +30,8 @@ class ClientOwner {
   virtual void on_relief(Client& client) = 0;
   /** Most bytes that are kept for one client. */
   [[nodiscard]] virtual std::size_t queue_bound() const = 0;
+  /** Age from which an event is stale. */
+  [[nodiscard]] virtual std::chrono::milliseconds stale_age() const = 0;
 };
 
 /** A connection: requests come in, packets go out. */
@@ -36,8 +39,10 @@ class Client {
  public:
   Client(Loop& loop, Descriptor socket, std::string label, ClientOwner& owner);
 
-  /** Sends a packet, now or when the client reads; disconnects it when it has left too much unread. */
-  void send(SharedFrame frame, const SubscriptionName& name = {});
+  /** Sends an answer, now or when the client reads; disconnects it when it has left too much unread. */
+  void send(SharedFrame frame) { push(std::move(frame), {}, std::nullopt); }
+  /** Sends an event likewise; it may be dropped when it is stale by then. */
+  void tell(SharedFrame frame, const SubscriptionName& name = {}) { push(std::move(frame), name, loop_.now()); }
 
   /** Ends the connection. */
   void disconnect();
@@ -52,8 +57,11 @@ class Client {
 
   SubscriptionList subscriptions;
   bool follows_configuration = false; /**< it has asked for the configuration */
+  bool discards_stale = false;        /**< it has asked to be told nothing stale */
 
  private:
+  void push(SharedFrame frame, const SubscriptionName& name, OutputQueue::Time told_at);
+  void drop_stale();
   void on_ready(int events);
   void receive();
   void take_requests();

@@ -30,7 +30,7 @@ Cluster::Cluster(Configuration configuration)
       available_(configuration_.networks.size(), true) {
   Delta start;
   for (const auto& [number, adapter] : configuration_.adapters) {
-    settle(adapter, start);
+    settle(adapter, Cause::Monitor, start);
   }
   settle_nodes(start);
 }
@@ -46,9 +46,9 @@ std::vector<Event> Cluster::apply(const Change& wanted) {
   return events_of(delta);
 }
 
-void Cluster::change(const AdapterDeath& death, Delta& delta) { set_working(death.adapters, false, delta); }
+void Cluster::change(const AdapterDeath& death, Delta& delta) { set_working(death.adapters, false, Cause::Monitor, delta); }
 
-void Cluster::change(const AdapterJoin& join, Delta& delta) { set_working(join.adapters, true, delta); }
+void Cluster::change(const AdapterJoin& join, Delta& delta) { set_working(join.adapters, true, Cause::Monitor, delta); }
 
 void Cluster::change(const NodeDeath& death, Delta& delta) {
   delta.ffdc_id = death.ffdc_id;
@@ -85,22 +85,88 @@ void Cluster::change(const DifferentInstance& sender, Delta& delta) { delta.noti
 
 void Cluster::change(const HeartbeatSettings& settings, Delta& delta) { delta.notices.emplace_back().body = settings; }
 
-void Cluster::set_working(const std::vector<Hb_Adapter_Number>& adapters, bool working, Delta& delta) {
+void Cluster::change(const AdapterSilence& silence, Delta& /*delta*/) {
+  for_each_configured(silence.adapters, [](Adapter& adapter) { adapter.up = false; });
+}
+
+void Cluster::change(const ReportedDeath& report, Delta& delta) {
+  set_working(report.adapters, false, Cause::Request, delta);
+}
+
+void Cluster::change(const SuspicionEnd& end, Delta& delta) {
+  for_each_configured(end.adapters, [&](const Adapter& adapter) { settle(adapter, Cause::Request, delta); });
+}
+
+void Cluster::change(const MonitoringSwitch& wanted, Delta& delta) {
+  for_each_configured({wanted.adapter}, [&](const Adapter& adapter) {
+    const bool before = std::exchange(steering_[adapter.number].monitored, wanted.on);
+    if (wanted.on && !before) {
+      tell_again(adapter, delta);
+    }
+  });
+}
+
+void Cluster::change(const InterfaceSwitch& wanted, Delta& delta) {
+  for_each_configured({wanted.adapter}, [&](const Adapter& adapter) {
+    steering_[adapter.number].interface_on = wanted.on;
+    settle(adapter, Cause::Request, delta);
+  });
+}
+
+void Cluster::change(const GraceSwitch& grace, Delta& delta) {
+  for_each_configured({grace.adapter}, [&](const Adapter& adapter) {
+    steering_[adapter.number].has_grace = grace.on;
+    settle(adapter, Cause::Monitor, delta);
+  });
+}
+
+void Cluster::change(const ManualControl& control, Delta& delta) {
+  if (control.on) {
+    manual_.insert(control.interface);
+    return;
+  }
+  manual_.erase(control.interface);
+  for (const auto& [number, adapter] : configuration_.adapters) {
+    settle(adapter, Cause::Monitor, delta);
+  }
+}
+
+void Cluster::change(const AddressChange& update, Delta& delta) {
+  for (const NewAddress& each : update.addresses) {
+    for_each_configured({each.adapter}, [&](Adapter& adapter) {
+      adapter.address = each.address.value_or(Hb_IP_address6{});
+      steering_[adapter.number].has_address = each.address.has_value();
+      settle(adapter, Cause::Request, delta);
+    });
+  }
+  ++configuration_sequence_;
+  delta.reconfigured = true;
+}
+
+template <typename Visit>
+void Cluster::for_each_configured(const std::vector<Hb_Adapter_Number>& adapters, Visit visit) {
   for (const auto number : adapters) {
     const auto found = configuration_.adapters.find(number);
     if (found != configuration_.adapters.end()) {
-      found->second.up = working;
-      settle(found->second, delta);
+      visit(found->second);
     }
   }
 }
 
+void Cluster::set_working(const std::vector<Hb_Adapter_Number>& adapters, bool working, Cause cause, Delta& delta) {
+  for_each_configured(adapters, [&](Adapter& adapter) {
+    adapter.up = working;
+    settle(adapter, cause, delta);
+  });
+}
+
 void Cluster::set_running(Hb_Node_Number node, bool running, Delta& delta) {
   runs_[static_cast<std::size_t>(node)] = running;
+  delta.touched_nodes.insert(node);
   const auto& adapters = configuration_.adapters;
   const auto end = adapters.lower_bound(configuration_.adapter_number(node + 1, 0));
   for (auto each = adapters.lower_bound(configuration_.adapter_number(node, 0)); each != end; ++each) {
-    settle(each->second, delta);
+    settle(each->second, Cause::Request, delta);
   }
 }
 
@@ -108,12 +174,13 @@ void Cluster::set_available(Hb_Network_Number network, bool available, Delta& de
   available_[static_cast<std::size_t>(network)] = available;
   for (const auto& [number, adapter] : configuration_.adapters) {
     if (adapter.network == network) {
-      settle(adapter, delta);
+      settle(adapter, Cause::Monitor, delta);
     }
   }
 }
 
 void Cluster::remove_adapter(Hb_Adapter_Number number, Delta& delta) {
+  steering_.erase(number);
   if (configuration_.adapters.erase(number) != 0 && up_adapters_.contains(number)) {
     lower(number, HB_DIED_BECAUSE_REMOVED_BIT, delta);
   }
@@ -125,7 +192,7 @@ void Cluster::add_adapter(const Adapter& adapter, Delta& delta) {
     runs_[static_cast<std::size_t>(node)] = true;
   }
   const auto [place, added] = configuration_.adapters.insert_or_assign(adapter.number, adapter);
-  settle(place->second, delta);
+  settle(place->second, Cause::Request, delta);
 }
 
 bool Cluster::has_adapters(Hb_Node_Number node) const {
@@ -135,12 +202,40 @@ bool Cluster::has_adapters(Hb_Node_Number node) const {
 
 bool Cluster::should_be_up(const Adapter& adapter) const {
   const auto node = static_cast<std::size_t>(configuration_.node_of(adapter.number));
-  return adapter.up && runs_[node] && available_[static_cast<std::size_t>(adapter.network)];
+  const Steering steering = steering_of(adapter.number);
+  return adapter.up && steering.has_address && steering.interface_on && runs_[node] &&
+         available_[static_cast<std::size_t>(adapter.network)];
 }
 
-void Cluster::settle(const Adapter& adapter, Delta& delta) {
+Cluster::Steering Cluster::steering_of(Hb_Adapter_Number adapter) const {
+  const auto found = steering_.find(adapter);
+  return found == steering_.end() ? Steering{} : found->second;
+}
+
+bool Cluster::is_manual(const Adapter& adapter) const {
+  return !manual_.empty() && configuration_.node_of(adapter.number) == configuration_.local_node &&
+         manual_.contains(adapter.type);
+}
+
+bool Cluster::is_held(const Adapter& adapter, bool wanted, Cause cause) const {
+  const Steering steering = steering_of(adapter.number);
+  return !steering.monitored || (steering.has_grace && !wanted) || (cause == Cause::Monitor && is_manual(adapter));
+}
+
+Hb_Adapter_state_t Cluster::state(Hb_Adapter_Number adapter) const {
+  const Steering steering = steering_of(adapter);
+  if (!steering.monitored) {
+    return Hb_Adapter_Not_Monitored;
+  }
+  if (!steering.interface_on) {
+    return Hb_Adapter_ifconfig_Down;
+  }
+  return up_adapters_.contains(adapter) ? Hb_Adapter_Up : Hb_Adapter_Down;
+}
+
+void Cluster::settle(const Adapter& adapter, Cause cause, Delta& delta) {
   const bool wanted = should_be_up(adapter);
-  if (wanted == up_adapters_.contains(adapter.number)) {
+  if (wanted == up_adapters_.contains(adapter.number) || is_held(adapter, wanted, cause)) {
     return;
   }
   if (wanted) {
@@ -150,14 +245,30 @@ void Cluster::settle(const Adapter& adapter, Delta& delta) {
   }
 }
 
+/* Whoever was not told of an adapter for a while learns how it is, changed or not. */
+void Cluster::tell_again(const Adapter& adapter, Delta& delta) {
+  const bool wanted = should_be_up(adapter);
+  if (wanted != up_adapters_.contains(adapter.number)) {
+    settle(adapter, Cause::Request, delta);
+  } else if (wanted) {
+    join(adapter.number, delta);
+  } else {
+    delta.died.push_back({adapter.number, incarnations_[adapter.number]});
+  }
+}
+
 void Cluster::raise(Hb_Adapter_Number number, Delta& delta) {
   const Hb_Node_Number node = configuration_.node_of(number);
   up_adapters_.add(number);
   ++up_count_[static_cast<std::size_t>(node)];
+  delta.touched_nodes.insert(node);
+  join(number, delta);
+}
+
+void Cluster::join(Hb_Adapter_Number number, Delta& delta) {
   /* The flag's bit never becomes part of an incarnation. */
   incarnations_[number] = (incarnations_[number] + 1) & (HB_DIED_BECAUSE_REMOVED_BIT - 1);
   delta.joined.push_back({number, incarnations_[number]});
-  delta.touched_nodes.insert(node);
 }
 
 void Cluster::lower(Hb_Adapter_Number number, Hb_Incarnation flag, Delta& delta) {
@@ -171,7 +282,7 @@ void Cluster::lower(Hb_Adapter_Number number, Hb_Incarnation flag, Delta& delta)
 void Cluster::settle_nodes(Delta& delta) {
   for (const auto node : delta.touched_nodes) {
     const auto index = static_cast<std::size_t>(node);
-    const bool wanted = up_count_[index] > 0;
+    const bool wanted = runs_[index] && up_count_[index] > 0;
     if (wanted == up_nodes_.contains(index)) {
       continue;
     }

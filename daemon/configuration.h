@@ -25,6 +25,13 @@ struct Adapter {
 struct Network {
   std::string name;
   std::string type;
+  bool ip = true; /**< whether it carries IP */
+};
+
+/** How a node is reached. */
+struct Route {
+  std::vector<Hb_IP_address6> hops; /**< its own address is the last one */
+  bool ip = true;                   /**< whether all networks on the way carry IP */
 };
 
 /** The configuration that is published and sent to clients. */
@@ -35,6 +42,7 @@ struct Configuration {
   int adapters_per_node = 1;
   std::vector<Network> networks;
   std::map<Hb_Adapter_Number, Adapter> adapters;
+  std::map<Hb_Node_Number, Route> given_routes; /**< these hold whatever the adapters say */
   timeval remote_node_down_period{};
   timeval local_node_down_period{};
 

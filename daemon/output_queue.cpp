@@ -68,7 +68,8 @@ std::optional<std::size_t> send_pieces(int socket, const Frame& frame, const Sub
 
 }  // namespace
 
-OutputQueue::Result OutputQueue::push(int socket, SharedFrame frame, const SubscriptionName& name, std::size_t bound) {
+OutputQueue::Result OutputQueue::push(int socket, SharedFrame frame, const SubscriptionName& name, std::size_t bound,
+                                      Time told_at) {
   std::size_t sent = 0;
   if (entries_.empty()) {
     const auto taken = send_pieces(socket, *frame, name, 0);
@@ -85,8 +86,16 @@ OutputQueue::Result OutputQueue::push(int socket, SharedFrame frame, const Subsc
     return Result::Full;
   }
   size_ += left;
-  entries_.push_back({std::move(frame), name, sent});
+  entries_.push_back({std::move(frame), name, sent, told_at});
   return Result::Kept;
+}
+
+std::size_t OutputQueue::drop_told_before(std::chrono::milliseconds time) {
+  return std::erase_if(entries_, [&](const Entry& entry) {
+    const bool is_stale = entry.sent == 0 && entry.told_at && *entry.told_at < time;
+    size_ -= is_stale ? entry.frame->size() : 0;
+    return is_stale;
+  });
 }
 
 OutputQueue::Result OutputQueue::flush(int socket) {

@@ -2,8 +2,10 @@
 #ifndef HBD_OUTPUT_QUEUE_H
 #define HBD_OUTPUT_QUEUE_H
 
+#include <chrono>
 #include <cstddef>
 #include <deque>
+#include <optional>
 
 #include "frame.h"
 
@@ -19,8 +21,14 @@ class OutputQueue {
     Broken /**< the socket takes nothing any more; errno says why */
   };
 
+  /** When an event was told; answers have no such time. */
+  using Time = std::optional<std::chrono::milliseconds>;
+
   /** Sends or keeps one frame, under a subscription's name. */
-  Result push(int socket, SharedFrame frame, const SubscriptionName& name, std::size_t bound);
+  Result push(int socket, SharedFrame frame, const SubscriptionName& name, std::size_t bound, Time told_at = {});
+
+  /** Drops the events that were told before that time, unless a part of one is sent; yields how many. */
+  std::size_t drop_told_before(std::chrono::milliseconds time);
 
   /** Sends what is kept, as far as the socket takes it. */
   Result flush(int socket);
@@ -34,6 +42,7 @@ class OutputQueue {
     SharedFrame frame;
     SubscriptionName name;
     std::size_t sent;
+    Time told_at;
   };
 
   std::deque<Entry> entries_;

@@ -213,4 +213,18 @@ SharedFrame answer_frame(Hb_Client_Reply kind, std::int32_t value) {
   return packet.share();
 }
 
+SharedFrame state_frame(std::int32_t status, Hb_Adapter_state_t state) {
+  Packet packet(HB_ADAPTER_STATE, sizeof(state));
+  packet.put_header(offsetof(client_packet, value), status);
+  packet.put(static_cast<std::int32_t>(state));
+  return packet.share();
+}
+
+SharedFrame route_frame(std::uint16_t length, const Hb_Source_Route& hops) {
+  Packet packet(HB_ROUTE, sizeof(hops));
+  packet.put_header(offsetof(client_packet, value), std::int32_t{length});
+  packet.put(hops);
+  return packet.share();
+}
+
 }  // namespace hbd

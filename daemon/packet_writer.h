@@ -5,6 +5,8 @@
 #include "cluster.h"
 #include "event.h"
 #include "frame.h"
+#include "hb_client/control.h"
+#include "hb_client/route.h"
 
 namespace hbd {
 
@@ -16,6 +18,12 @@ SharedFrame configuration_frame(const Cluster& cluster);
 
 /** An answer without a message. */
 SharedFrame answer_frame(Hb_Client_Reply kind, std::int32_t value);
+
+/** An answer with an adapter's state. */
+SharedFrame state_frame(std::int32_t status, Hb_Adapter_state_t state);
+
+/** An answer with a route. */
+SharedFrame route_frame(std::uint16_t length, const Hb_Source_Route& hops);
 
 }  // namespace hbd
 

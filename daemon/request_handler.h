@@ -2,16 +2,24 @@
 #ifndef HBD_REQUEST_HANDLER_H
 #define HBD_REQUEST_HANDLER_H
 
+#include "adapter_control.h"
 #include "client.h"
 #include "cluster.h"
+#include "control_settings.h"
+#include "deadlines.h"
 #include "frame.h"
+#include "reports.h"
+#include "routes.h"
+#include "scripted_answers.h"
 
 namespace hbd {
 
-/** Answers requests from the cluster as it stands. */
+/** Gives requests their effect on the cluster, and answers them from it as it stands then. */
 class RequestHandler {
  public:
-  explicit RequestHandler(const Cluster& cluster) : cluster_(cluster) {}
+  /** @param sink takes the changes that requests make to the cluster. */
+  RequestHandler(Loop& loop, const Cluster& cluster, ChangeSink& sink, InterfaceControl& interfaces, RouteTable& routes,
+                 const ControlSettings& settings);
 
   /** Serves one well-formed request. */
   void handle(Client& client, const Request& request);
@@ -20,15 +28,42 @@ class RequestHandler {
   [[nodiscard]] std::size_t configuration_size();
 
  private:
+  using Serve = void (RequestHandler::*)(Client& client, const PlainRequest& request);
+  struct Effect {
+    Hb_Client_Request request;
+    Serve serve;
+  };
+  static const Effect effects[];
+
   void serve(Client& client, const PlainRequest& request);
   void serve(Client& client, const SubscribeRequest& request);
   void serve(Client& client, const UnsubscribeRequest& request);
   void serve(Client& client, const MalformedRequest& request);
+
+  void send_configuration(Client& client, const PlainRequest& request);
+  void send_route(Client& client, const PlainRequest& request);
+  void send_state(Client& client, const PlainRequest& request);
+  void steer_adapter(Client& client, const PlainRequest& request);
+  void take_report(Client& client, const PlainRequest& request);
+  void simulate_death(Client& client, const PlainRequest& request);
+  void discard_stale(Client& client, const PlainRequest& request);
+  void route_message(Client& client, const PlainRequest& request);
+  void take_heartbeat(Client& client, const PlainRequest& request);
+  void switch_manual_control(Client& client, const PlainRequest& request);
   const SharedFrame& configuration();
 
   const Cluster& cluster_;
+  ChangeSink& sink_;
+  RouteTable& routes_;
+  Deadlines deadlines_;
+  AdapterControl adapters_;
+  Reports reports_;
+  ScriptedAnswers answers_;
+  HeartbeatAnswer heartbeat_;
   SharedFrame configuration_;
   Hb_Seq_Num configuration_stands_for_ = 0; /* number of the last event that the frame knows of */
+  std::uint64_t routed_messages_ = 0;
+  std::uint64_t routed_bytes_ = 0;
 };
 
 }  // namespace hbd

@@ -82,6 +82,44 @@ Request parse_unsubscribe(std::span<const std::uint8_t> data) {
   return request;
 }
 
+/* Data of a request about an adapter of this node; the value follows the network in those that have one. */
+AdapterTarget target_in(std::span<const std::uint8_t> data) {
+  hb_adapter_value target{};
+  std::memcpy(&target, data.data(), std::min(data.size(), sizeof(target)));
+  return {target.network, target.value};
+}
+
+Request parse_routing(std::int32_t length, std::span<const std::uint8_t> data) {
+  auto message = parse_routing_message(data);
+  if (const auto* reason = std::get_if<std::string>(&message)) {
+    return MalformedRequest{*reason};
+  }
+  return PlainRequest{HB_DAEMON_ROUTING_REQUEST, length, std::get<RoutingMessage>(std::move(message))};
+}
+
+PlainRequest::Data data_in(Hb_Client_Request code, std::span<const std::uint8_t> data) {
+  switch (code) {
+    case HB_ENABLE_ADAPTER:
+    case HB_DISABLE_ADAPTER:
+    case HB_IFCONFIG_DOWN:
+    case HB_IFCONFIG_UP:
+    case HB_CONFIGURE_ADAPTER:
+    case HB_UNCONFIGURE_ADAPTER:
+    case HB_ADAPTER_GRACE_REQ:
+    case HB_SWAP_ADAPTERS:
+    case HB_GET_ADAPTER_STATE:
+      return target_in(data);
+    case HB_SIMULATE_DEATH:
+    case HB_CLIENT_HEARTBEAT:
+      return field_at<std::uint32_t>(data, 0);
+    case HB_ENABLE_MANUAL_CONTROL_NIMS:
+    case HB_DISABLE_MANUAL_CONTROL_NIMS:
+      return std::string(data.begin(), data.end());
+    default:
+      return {};
+  }
+}
+
 std::optional<MalformedRequest> complaint(const Rule* rule, std::int32_t code, std::int32_t length,
                                           std::size_t data_size) {
   if (rule == nullptr) {
@@ -116,8 +154,10 @@ Request parse_request(std::span<const std::uint8_t> packet) {
       return parse_subscribe(data);
     case HB_UNSUBSCRIBE:
       return parse_unsubscribe(data);
+    case HB_DAEMON_ROUTING_REQUEST:
+      return parse_routing(length, data);
     default:
-      return PlainRequest{rule->code, length};
+      return PlainRequest{rule->code, length, data_in(rule->code, data)};
   }
 }
 

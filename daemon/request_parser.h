@@ -7,8 +7,10 @@
 #include <string>
 #include <variant>
 
+#include "adapter_control.h"
 #include "frame.h"
 #include "hb_protocol/requests.h"
+#include "routing_message.h"
 #include "subscription.h"
 
 namespace hbd {
@@ -29,8 +31,12 @@ struct UnsubscribeRequest {
 
 /** Every other request that is known. */
 struct PlainRequest {
+  /** What it carries: an adapter of this node, a number of 32 bits, an interface's name, or a message to route. */
+  using Data = std::variant<std::monostate, AdapterTarget, std::uint32_t, std::string, RoutingMessage>;
+
   Hb_Client_Request code = HB_GET_CONFIG_INFO;
   std::int32_t number = 0; /**< what `len` says: a number for those that carry one, else the size of the data */
+  Data data;
 };
 
 /** A packet that is no request; says what is wrong with it. */

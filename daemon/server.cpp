@@ -59,12 +59,12 @@ void Server::deliver(const Event& event, const Cluster& cluster) {
     bool told = false;
     for (const auto& subscription : client->subscriptions) {
       if (subscription.wants(event, cluster)) {
-        client->send(bytes(), subscription.name);
+        client->tell(bytes(), subscription.name);
         told = true;
       }
     }
     if (by_client && !told && client->follows_configuration) {
-      client->send(bytes());
+      client->tell(bytes());
     }
   }
 }

@@ -31,6 +31,9 @@ class Server : public Audience, public ClientOwner {
   /** Sets how many bytes are kept for a client that does not read. */
   void set_queue_bound(std::size_t bytes) { queue_bound_ = bytes; }
 
+  /** Sets the age from which events are dropped for clients that have asked for it. */
+  void set_stale_age(std::chrono::milliseconds age) { stale_age_ = age; }
+
   [[nodiscard]] std::size_t clients() const;
   [[nodiscard]] std::size_t subscriptions() const override;
   [[nodiscard]] bool has_read() const override;
@@ -45,12 +48,14 @@ class Server : public Audience, public ClientOwner {
   void on_request(Client& client, const Request& request) override;
   void on_relief(Client& client) override;
   [[nodiscard]] std::size_t queue_bound() const override { return queue_bound_; }
+  [[nodiscard]] std::chrono::milliseconds stale_age() const override { return stale_age_; }
 
   Loop& loop_;
   int listening_;
   RequestCallback on_request_;
   std::function<void()> changed_ = [] {};
   std::size_t queue_bound_ = 0;
+  std::chrono::milliseconds stale_age_{10000};
   Descriptor spare_; /* given up for a moment to turn a client away when descriptors run out */
   unsigned long last_number_ = 0;
   bool some_left_ = false;

@@ -7,6 +7,7 @@
 
 #include "VEX_HBC_trace.h"
 #include "argument_check.h"
+#include "configured_numbers.h"
 #include "hb_global_data/address_text.h"
 #include "hb_global_data/node_table.h"
 #include "hb_global_data/record_index.h"
@@ -21,27 +22,6 @@ bool is_configured(Hb_Adapter_Number adapter) { return find_configured_adapter(a
 Hb_Adapter_Number adapter_in_slot(int node, int offset) {
   return static_cast<Hb_Adapter_Number>(node) * static_cast<Hb_Adapter_Number>(table().Hb_adapters_per_node) +
          static_cast<Hb_Adapter_Number>(offset);
-}
-
-// The record of an adapter, or null with HB_EINVAL or HB_ENOADAPTER set.
-Hb_Adapter* find_adapter(Hb_Adapter_Number adapter) {
-  if (adapter >= adapter_number_limit(table())) {
-    set_hb_errno(HB_EINVAL);
-    return nullptr;
-  }
-  Hb_Adapter* record = find_configured_adapter(adapter);
-  if (record == nullptr) {
-    set_hb_errno(HB_ENOADAPTER);
-    return nullptr;
-  }
-  return record;
-}
-
-Hb_Rc check_configured_node(Hb_Node_Number node) {
-  if (!is_node_number(table(), node)) {
-    return fail(HB_EINVAL);
-  }
-  return global_node_tbl[node] == Hb_True ? Hb_Success : fail(HB_ENONODE);
 }
 
 // Copies a text field with a terminator into a buffer of the field's size.
@@ -188,7 +168,7 @@ Hb_Rc hb_get_adapter_number_by_node_number(Hb_Node_Number node, int offset, Hb_A
 }
 
 Hb_Rc hb_get_node_number_by_adapter_number(Hb_Adapter_Number adapter, Hb_Node_Number* node) {
-  if (start_with(node) != Hb_Success || find_adapter(adapter) == nullptr) {
+  if (start_with(node) != Hb_Success || configured_adapter(adapter) == nullptr) {
     return Hb_Failure;
   }
   *node = static_cast<Hb_Node_Number>(adapter / static_cast<Hb_Adapter_Number>(table().Hb_adapters_per_node));
@@ -228,7 +208,7 @@ Hb_Rc hb_get_adapter_address_by_number(Hb_Adapter_Number adapter, Hb_IP_address6
   if (start_with(address) != Hb_Success) {
     return Hb_Failure;
   }
-  Hb_Adapter* record = find_adapter(adapter);
+  Hb_Adapter* record = configured_adapter(adapter);
   if (record == nullptr) {
     return Hb_Failure;
   }
@@ -243,7 +223,7 @@ Hb_Rc hb_get_adapter_type_by_number(Hb_Adapter_Number adapter, char* adapter_typ
   if (start_with(adapter_type) != Hb_Success) {
     return Hb_Failure;
   }
-  const Hb_Adapter* record = find_adapter(adapter);
+  const Hb_Adapter* record = configured_adapter(adapter);
   if (record == nullptr) {
     return Hb_Failure;
   }

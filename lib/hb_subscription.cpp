@@ -9,6 +9,7 @@
 #include "VEX_EVMONNewGroupEventHandler.h"
 #include "VEX_HBC_trace.h"
 #include "argument_check.h"
+#include "configured_numbers.h"
 #include "hb_client/events.h"
 #include "hb_communication/connection.h"
 #include "hb_global_data/node_table.h"
@@ -104,14 +105,8 @@ Hb_Rc hb_change_network_in_subscription_group(Hb_Subscription_Group* group, Hb_N
 }
 
 Hb_Rc hb_change_node_subscription_group(Hb_Subscription_Group* group, Hb_Node_Number node, int add) {
-  if (start_with(group) != Hb_Success) {
+  if (start_with(group) != Hb_Success || check_configured_node(node) != Hb_Success) {
     return Hb_Failure;
-  }
-  if (!is_node_number(table(), node)) {
-    return fail(HB_EINVAL);
-  }
-  if (global_node_tbl[node] != Hb_True) {
-    return fail(HB_ENONODE);
   }
   return change_member(group, node_worker, static_cast<uint32_t>(node), add);
 }
