@@ -3,6 +3,7 @@
 
 #include <cstring>
 
+#include "hb_communication/event_reception.h"
 #include "queries/event_outputs.h"
 #include "steering.h"
 
@@ -12,6 +13,7 @@ namespace {
 class HeartbeatSettings : public Steering {
  protected:
   HeartbeatSettings() { std::memset(&settings, 0xB7, sizeof settings); }
+  ~HeartbeatSettings() override { client_hb_info = {}; }  // a stop keeps them
 
   // Has the daemon tell them in an event.
   Hb_Rc told(int32_t seconds, int32_t microseconds, int32_t enabled, int32_t process) {

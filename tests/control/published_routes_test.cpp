@@ -276,6 +276,7 @@ TEST_P(PublishedRoute, HoldsNothingWhenItsReaderIsCancelledWhileItWaits) {
 std::atomic<int> signals = 0;
 
 TEST_P(PublishedRoute, IsAwaitedFurtherAfterASignal) {
+  signals = 0;
   struct sigaction action = {};
   action.sa_handler = [](int) { ++signals; };
   ASSERT_EQ(0, sigaction(SIGUSR1, &action, nullptr));

@@ -13,7 +13,9 @@ namespace {
 
 class RouteRequest : public Steering {
  protected:
-  static Bytes answer(int32_t value, const Bytes& message) { return ReplyPacket(8).value(value).message(message).bytes(); }
+  static Bytes answer(int32_t value, const Bytes& message) {
+    return ReplyPacket(8).value(value).message(message).bytes();
+  }
 
   Hb_Rc ask(Hb_Node_Number node) { return hb_get_route(node, &out.route, &out.length); }
 

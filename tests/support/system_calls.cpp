@@ -161,7 +161,6 @@ HB_WRAP_3(int, shmget, key_t, size_t, int)
 HB_WRAP_3(void*, shmat, int, const void*, int)
 HB_WRAP_1(int, shmdt, const void*)
 HB_WRAP_3(int, semget, key_t, int, int)
-HB_WRAP_3(int, semop, int, struct sembuf*, size_t)
 HB_WRAP_1(int, pthread_mutexattr_init, pthread_mutexattr_t*)
 HB_WRAP_2(int, pthread_mutexattr_settype, pthread_mutexattr_t*, int)
 HB_WRAP_1(int, pthread_mutexattr_destroy, pthread_mutexattr_t*)
@@ -170,6 +169,15 @@ HB_WRAP_1(int, pthread_mutex_destroy, pthread_mutex_t*)
 HB_WRAP_1(int, pthread_mutex_lock, pthread_mutex_t*)
 HB_WRAP_1(int, pthread_mutex_unlock, pthread_mutex_t*)
 HB_WRAP_4(const char*, inet_ntop, int, const void*, char*, socklen_t)
+
+__attribute__((weak)) int __real_semop(int, sembuf*, size_t);
+int __wrap_semop(int set, sembuf* operations, size_t count);
+int __wrap_semop(int set, sembuf* operations, size_t count) {
+  const Outcome outcome = turn("semop", [&] {
+    return SystemCall{{set, word(operations), word(count)}, copy_of(operations, count * sizeof *operations)};
+  });
+  return outcome.is_made ? __real_semop(set, operations, count) : static_cast<int>(outcome.result);
+}
 
 __attribute__((weak)) ssize_t __real_read(int, void*, size_t);
 ssize_t __wrap_read(int fd, void* buffer, size_t count);

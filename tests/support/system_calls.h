@@ -37,8 +37,8 @@ Outcome interrupted(timeval time_left);
 // One call that was made of a wrapped function.
 struct SystemCall {
   std::vector<intptr_t> arguments;
-  // writev and write: the bytes given. setsockopt: the value. connect: the address. select: 128 bytes of each set
-  // (zeros for a null set), then 16 of the time-out (none for a null one).
+  // writev and write: the bytes given. setsockopt: the value. connect: the address. semop: the operations, 6 bytes
+  // each. select: 128 bytes of each set (zeros for a null set), then 16 of the time-out (none for a null one).
   std::string bytes;
 };
 
