@@ -4,6 +4,7 @@
 
 #include <optional>
 #include <string>
+#include <utility>
 #include <variant>
 #include <vector>
 
@@ -119,10 +120,10 @@ struct AddressChange {
   std::vector<NewAddress> addresses;
 };
 
-using Change = std::variant<AdapterDeath, AdapterJoin, NodeDeath, NodeJoin, NetworkLoss, NetworkReturn,
-                            ConfigurationChange, FailureData, DifferentInstance, HeartbeatSettings, AdapterSilence,
-                            ReportedDeath, SuspicionEnd, MonitoringSwitch, InterfaceSwitch, GraceSwitch, ManualControl,
-                            AddressChange>;
+using Change =
+    std::variant<AdapterDeath, AdapterJoin, NodeDeath, NodeJoin, NetworkLoss, NetworkReturn, ConfigurationChange,
+                 FailureData, DifferentInstance, HeartbeatSettings, AdapterSilence, ReportedDeath, SuspicionEnd,
+                 MonitoringSwitch, InterfaceSwitch, GraceSwitch, ManualControl, AddressChange>;
 
 /** Takes changes from a membership source. */
 class ChangeSink {
@@ -132,6 +133,22 @@ class ChangeSink {
   ChangeSink& operator=(const ChangeSink&) = delete;
   virtual ~ChangeSink() = default;
   virtual void apply(const Change& change) = 0;
+};
+
+/** Keeps changes until they are passed on. */
+class PendingChanges : public ChangeSink {
+ public:
+  void apply(const Change& change) override { changes_.push_back(change); }
+
+  /** Passes them on in their order. */
+  void pass_on(ChangeSink& sink) {
+    for (const Change& change : std::exchange(changes_, {})) {
+      sink.apply(change);
+    }
+  }
+
+ private:
+  std::vector<Change> changes_;
 };
 
 }  // namespace hbd

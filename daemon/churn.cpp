@@ -9,7 +9,7 @@
 namespace hbd {
 namespace {
 
-constexpr std::array<std::pair<ChurnKind, std::string_view>, 10> names = {{
+constexpr std::array<std::pair<ChurnKind, std::string_view>, 11> names = {{
     {ChurnKind::AdapterDeath, "adapter-death"},
     {ChurnKind::AdapterJoin, "adapter-join"},
     {ChurnKind::NodeDeath, "node-death"},
@@ -20,6 +20,7 @@ constexpr std::array<std::pair<ChurnKind, std::string_view>, 10> names = {{
     {ChurnKind::FailureData, "ffdc-id"},
     {ChurnKind::DifferentInstance, "different-instance"},
     {ChurnKind::Heartbeat, "heartbeat"},
+    {ChurnKind::AdapterSilence, "adapter-silence"},
 }};
 
 template <typename Keep>
@@ -122,16 +123,29 @@ std::optional<Change> Churn::make(ChurnKind kind, const Cluster& cluster) {
       return different_instance(cluster);
     case ChurnKind::Heartbeat:
       return heartbeat();
+    case ChurnKind::AdapterSilence:
+      return adapter_silence(cluster);
   }
   return std::nullopt;
 }
 
-std::optional<Change> Churn::adapter_death(const Cluster& cluster) {
-  const auto victims = up_adapters(cluster, [&](Hb_Adapter_Number victim) {
+/* Adapters that the local node can do without. */
+std::vector<Hb_Adapter_Number> Churn::victims(const Cluster& cluster) {
+  return up_adapters(cluster, [&](Hb_Adapter_Number victim) {
     return !is_local(cluster, victim) || local_node_survives(cluster, [&](auto number) { return number == victim; });
   });
-  const auto* victim = pick(victims);
+}
+
+std::optional<Change> Churn::adapter_death(const Cluster& cluster) {
+  const auto all = victims(cluster);
+  const auto* victim = pick(all);
   return victim == nullptr ? std::nullopt : std::optional<Change>(AdapterDeath{{*victim}});
+}
+
+std::optional<Change> Churn::adapter_silence(const Cluster& cluster) {
+  const auto all = victims(cluster);
+  const auto* victim = pick(all);
+  return victim == nullptr ? std::nullopt : std::optional<Change>(AdapterSilence{{*victim}});
 }
 
 std::optional<Change> Churn::adapter_join(const Cluster& cluster) {

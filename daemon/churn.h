@@ -27,7 +27,9 @@ class Churn {
 
  private:
   std::optional<Change> make(ChurnKind kind, const Cluster& cluster);
+  static std::vector<Hb_Adapter_Number> victims(const Cluster& cluster);
   std::optional<Change> adapter_death(const Cluster& cluster);
+  std::optional<Change> adapter_silence(const Cluster& cluster);
   std::optional<Change> adapter_join(const Cluster& cluster);
   std::optional<Change> node_death(const Cluster& cluster);
   std::optional<Change> node_join(const Cluster& cluster);

@@ -46,7 +46,9 @@ std::vector<Event> Cluster::apply(const Change& wanted) {
   return events_of(delta);
 }
 
-void Cluster::change(const AdapterDeath& death, Delta& delta) { set_working(death.adapters, false, Cause::Monitor, delta); }
+void Cluster::change(const AdapterDeath& death, Delta& delta) {
+  set_working(death.adapters, false, Cause::Monitor, delta);
+}
 
 void Cluster::change(const AdapterJoin& join, Delta& delta) { set_working(join.adapters, true, Cause::Monitor, delta); }
 

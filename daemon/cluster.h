@@ -111,8 +111,8 @@ class Cluster {
   MemberSet up_nodes_;
   std::vector<int> up_count_; /* by node: its adapters that are up */
   std::vector<Hb_Incarnation> incarnations_;
-  std::vector<bool> runs_;      /* by node */
-  std::vector<bool> available_; /* by network */
+  std::vector<bool> runs_;                         /* by node */
+  std::vector<bool> available_;                    /* by network */
   std::map<Hb_Adapter_Number, Steering> steering_; /* of those that a request has touched */
   std::set<std::string> manual_;                   /* interfaces of the local node */
   Hb_Incarnation adapter_group_ = 1;

@@ -1,18 +1,22 @@
 #include "daemon.h"
 
+#include <fmt/ranges.h>
 #include <spdlog/spdlog.h>
 
 #include <algorithm>
 
 namespace hbd {
 
-Daemon::Daemon(Loop& loop, const std::string& path, MembershipSource& source, std::size_t queue_bytes)
+Daemon::Daemon(Loop& loop, const std::string& path, MembershipSource& source, std::size_t queue_bytes,
+               const ServiceSettings& settings)
     : queue_bytes_(queue_bytes),
       cluster_(source.configuration()),
-      handler_(cluster_),
+      routes_(cluster_),
+      handler_(loop, cluster_, *this, source.interfaces(), routes_, source.control_settings()),
       claim_(loop, path, published()),
       server_(loop, claim_.listening(),
               [this](Client& client, const Request& request) { handler_.handle(client, request); }) {
+  server_.set_stale_age(settings.stale_age);
   keep_room_for_configurations();
 }
 
@@ -26,6 +30,10 @@ void Daemon::apply(const Change& change) {
   for (const Event& event : events) {
     spdlog::debug("event {} goes to {} clients", event.sequence, server_.clients());
     server_.deliver(event, cluster_);
+  }
+  if (const auto* suspicion = std::get_if<SuspicionEnd>(&change)) {
+    spdlog::info("the suspicion of adapters {} is {}", fmt::join(suspicion->adapters, ", "),
+                 events.empty() ? "cleared by their heartbeats" : "confirmed by their silence");
   }
 }
 

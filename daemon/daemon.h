@@ -11,7 +11,9 @@
 #include "loop.h"
 #include "membership_source.h"
 #include "request_handler.h"
+#include "routes.h"
 #include "server.h"
+#include "service_settings.h"
 
 namespace hbd {
 
@@ -24,7 +26,8 @@ class Daemon : public ChangeSink {
    * @param queue_bytes bytes that are kept for a client that does not read; two configurations are always kept.
    * @throws Failure when the path cannot be had.
    */
-  Daemon(Loop& loop, const std::string& path, MembershipSource& source, std::size_t queue_bytes);
+  Daemon(Loop& loop, const std::string& path, MembershipSource& source, std::size_t queue_bytes,
+         const ServiceSettings& settings = {});
 
   /** Makes a change to the cluster, publishes it and tells the clients. */
   void apply(const Change& change) override;
@@ -39,6 +42,7 @@ class Daemon : public ChangeSink {
 
   std::size_t queue_bytes_;
   Cluster cluster_;
+  RouteTable routes_;
   RequestHandler handler_;
   Claim claim_;
   Server server_;

@@ -97,11 +97,11 @@ int run(const hbd::Options& options) {
   hbd::Loop loop;
   if (options.host) {
     hbd::HostSource host(loop);
-    hbd::Daemon daemon(loop, options.socket_path, host, options.client_queue_bytes);
+    hbd::Daemon daemon(loop, options.socket_path, host, options.client_queue_bytes, options.service);
     serve(loop, options, host, daemon);
   } else {
     hbd::Simulation simulation(loop, load_scenario(options.scenario_file), options.pace);
-    hbd::Daemon daemon(loop, options.socket_path, simulation, options.client_queue_bytes);
+    hbd::Daemon daemon(loop, options.socket_path, simulation, options.client_queue_bytes, options.service);
     simulation.set_audience(daemon.server());
     serve(loop, options, simulation, daemon);
   }

@@ -5,6 +5,8 @@
 #include "change.h"
 #include "cluster.h"
 #include "configuration.h"
+#include "control_settings.h"
+#include "interface_control.h"
 
 namespace hbd {
 
@@ -18,6 +20,12 @@ class MembershipSource {
 
   /** The configuration at the start. */
   [[nodiscard]] virtual Configuration configuration() const = 0;
+
+  /** How requests are taken. */
+  [[nodiscard]] virtual ControlSettings control_settings() const { return {}; }
+
+  /** Where requests change interfaces and addresses; null when that is the cluster alone. */
+  virtual InterfaceControl* interfaces() { return nullptr; }
 
   /** Begins to pass changes on; `cluster` is what they are applied to. */
   virtual void start(ChangeSink& sink, const Cluster& cluster) = 0;

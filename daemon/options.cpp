@@ -1,8 +1,10 @@
 #include "options.h"
 
 #include <CLI/CLI.hpp>
+#include <chrono>
 #include <string>
 
+#include "duration.h"
 #include "exit_status.h"
 #include "socket_path.h"
 
@@ -47,6 +49,19 @@ void add_pace_options(CLI::App& app, Options& options) {
   }
 }
 
+/* An option that takes a length of time. */
+CLI::Option* add_duration(CLI::App& app, const std::string& name, std::chrono::milliseconds& duration,
+                          const std::string& description) {
+  const auto take = [&duration, name](const std::string& text) {
+    const auto parsed = parse_duration(text);
+    if (!parsed) {
+      throw CLI::ValidationError(name, "\"" + text + R"(" is no length of time as "250ms", "1.5s" or "2m")");
+    }
+    duration = std::chrono::ceil<std::chrono::milliseconds>(*parsed);
+  };
+  return app.add_option_function<std::string>(name, take, description)->type_name("DURATION");
+}
+
 void add_service_options(CLI::App& app, Options& options) {
   app.add_option("--socket", options.socket_path,
                  "Listen here instead of the path that the environment gives: HB_SERVER_SOCKET, with HA_DOMAIN_NAME "
@@ -57,6 +72,9 @@ void add_service_options(CLI::App& app, Options& options) {
       ->type_name("BYTES")
       ->capture_default_str()
       ->check(CLI::PositiveNumber);
+  add_duration(app, "--stale-age", options.service.stale_age,
+               "Drop events of this age that wait for a client which has asked to be told nothing stale")
+      ->default_str("10s");
   app.add_option("--ready-fd", options.ready_descriptor,
                  "Write one byte to this descriptor and close it when clients can connect")
       ->type_name("N")

@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 
+#include "service_settings.h"
 #include "simulation.h"
 
 namespace hbd {
@@ -18,6 +19,7 @@ struct Options {
   bool check = false;
   Pace pace;
   std::size_t client_queue_bytes = std::size_t{16} * 1024 * 1024;
+  ServiceSettings service;
   int ready_descriptor = -1;
   std::string log_level = "info";
 };

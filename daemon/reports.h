@@ -1,4 +1,5 @@
-/* What clients report of adapters and nodes: that they are, or may be, down; and the death of this node that is played. */
+/* What clients report of adapters and nodes: that they are, or may be, down; and the death of this node that is played.
+ */
 #ifndef HBD_REPORTS_H
 #define HBD_REPORTS_H
 

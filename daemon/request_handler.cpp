@@ -101,14 +101,15 @@ const RequestHandler::Effect RequestHandler::effects[] = {
     {HB_DISABLE_MANUAL_CONTROL_NIMS, &RequestHandler::switch_manual_control},
 };
 
-RequestHandler::RequestHandler(Loop& loop, const Cluster& cluster, ChangeSink& sink, InterfaceControl& interfaces,
+RequestHandler::RequestHandler(Loop& loop, const Cluster& cluster, ChangeSink& sink, InterfaceControl* interfaces,
                                RouteTable& routes, const ControlSettings& settings)
     : cluster_(cluster),
       sink_(sink),
       routes_(routes),
+      simulated_(changes_),
       deadlines_(loop, sink),
-      adapters_(cluster, sink, interfaces, deadlines_),
-      reports_(cluster, sink, deadlines_, settings.suspicion),
+      adapters_(cluster, changes_, interfaces == nullptr ? simulated_ : *interfaces, deadlines_),
+      reports_(cluster, changes_, deadlines_, settings.suspicion),
       answers_(settings.answers),
       heartbeat_(settings.heartbeat) {
   if (heartbeat_.settings.daemon_pid == 0) {
@@ -118,12 +119,13 @@ RequestHandler::RequestHandler(Loop& loop, const Cluster& cluster, ChangeSink& s
 
 void RequestHandler::handle(Client& client, const Request& request) {
   std::visit([&](const auto& one) { serve(client, one); }, request);
+  changes_.pass_on(sink_);
 }
 
 void RequestHandler::serve(Client& client, const PlainRequest& request) {
   spdlog::debug("{}: request {} with {}", client.label(), static_cast<int>(request.code), request.number);
-  const auto* const found =
-      std::find_if(std::begin(effects), std::end(effects), [&](const auto& each) { return each.request == request.code; });
+  const auto* const found = std::find_if(std::begin(effects), std::end(effects),
+                                         [&](const auto& each) { return each.request == request.code; });
   if (found != std::end(effects)) {
     (this->*found->serve)(client, request);
   }
@@ -233,7 +235,7 @@ void RequestHandler::switch_manual_control(Client& client, const PlainRequest& r
   }
   for (const std::string& interface : interfaces) {
     spdlog::info("{}: the monitor of {} is under {} control", client.label(), interface, on ? "manual" : "its own");
-    sink_.apply(ManualControl{interface, on});
+    changes_.apply(ManualControl{interface, on});
   }
 }
 

@@ -11,14 +11,18 @@
 #include "reports.h"
 #include "routes.h"
 #include "scripted_answers.h"
+#include "simulated_interfaces.h"
 
 namespace hbd {
 
 /** Gives requests their effect on the cluster, and answers them from it as it stands then. */
 class RequestHandler {
  public:
-  /** @param sink takes the changes that requests make to the cluster. */
-  RequestHandler(Loop& loop, const Cluster& cluster, ChangeSink& sink, InterfaceControl& interfaces, RouteTable& routes,
+  /**
+   * @param sink takes the changes that requests make to the cluster.
+   * @param interfaces where interfaces and addresses are changed; null: in the cluster alone.
+   */
+  RequestHandler(Loop& loop, const Cluster& cluster, ChangeSink& sink, InterfaceControl* interfaces, RouteTable& routes,
                  const ControlSettings& settings);
 
   /** Serves one well-formed request. */
@@ -55,6 +59,8 @@ class RequestHandler {
   const Cluster& cluster_;
   ChangeSink& sink_;
   RouteTable& routes_;
+  PendingChanges changes_; /* they wait for the answer: an event before it would be taken for the answer, and be lost */
+  SimulatedInterfaces simulated_;
   Deadlines deadlines_;
   AdapterControl adapters_;
   Reports reports_;

@@ -9,6 +9,7 @@
 
 #include "change.h"
 #include "configuration.h"
+#include "control_settings.h"
 
 namespace hbd {
 
@@ -29,7 +30,8 @@ enum class ChurnKind {
   ConfigurationUpdate,
   FailureData,
   DifferentInstance,
-  Heartbeat
+  Heartbeat,
+  AdapterSilence
 };
 
 /** Changes that a seed decides. */
@@ -45,6 +47,7 @@ struct Scenario {
   Configuration configuration;
   std::vector<Step> steps;
   std::optional<ChurnSettings> churn;
+  ControlSettings control;
 };
 
 }  // namespace hbd

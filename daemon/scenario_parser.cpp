@@ -8,7 +8,10 @@
 #include <set>
 #include <utility>
 
+#include "address.h"
 #include "churn.h"
+#include "hb_client/route.h"
+#include "scripted_answers.h"
 #include "toml_table.h"
 
 namespace hbd {
@@ -30,6 +33,9 @@ class ScenarioReader {
   void read_networks(TomlTable& root);
   void read_cluster(TomlTable& root);
   void read_limits(TomlTable& cluster, const std::vector<PlacedAdapter>& adapters);
+  void read_routes(TomlTable& root);
+  void read_client_heartbeat(TomlTable& root);
+  void read_answers(TomlTable& root);
   void read_events(TomlTable& root);
   void read_churn(TomlTable& root);
   [[nodiscard]] ChurnKind read_kind(const std::string& name, unsigned line) const;
@@ -46,6 +52,7 @@ class ScenarioReader {
   Change read_change(TomlTable& event);
   Change adapter_death(TomlTable& event) { return AdapterDeath{{read_configured_adapter(event)}}; }
   Change adapter_join(TomlTable& event) { return AdapterJoin{{read_configured_adapter(event)}}; }
+  Change adapter_silence(TomlTable& event) { return AdapterSilence{{read_configured_adapter(event)}}; }
   Change node_death(TomlTable& event);
   Change node_join(TomlTable& event);
   Change network_loss(TomlTable& event) { return NetworkLoss{read_network(event)}; }
@@ -59,13 +66,13 @@ class ScenarioReader {
     ChurnKind kind;
     Change (ScenarioReader::*read)(TomlTable&);
   };
-  static const std::array<Kind, 10> kinds;
+  static const std::array<Kind, 11> kinds;
 
   Scenario scenario_;
   std::set<Hb_Adapter_Number> configured_;
 };
 
-const std::array<ScenarioReader::Kind, 10> ScenarioReader::kinds = {{
+const std::array<ScenarioReader::Kind, 11> ScenarioReader::kinds = {{
     {ChurnKind::AdapterDeath, &ScenarioReader::adapter_death},
     {ChurnKind::AdapterJoin, &ScenarioReader::adapter_join},
     {ChurnKind::NodeDeath, &ScenarioReader::node_death},
@@ -76,6 +83,7 @@ const std::array<ScenarioReader::Kind, 10> ScenarioReader::kinds = {{
     {ChurnKind::FailureData, &ScenarioReader::failure_data},
     {ChurnKind::DifferentInstance, &ScenarioReader::different_instance},
     {ChurnKind::Heartbeat, &ScenarioReader::heartbeat},
+    {ChurnKind::AdapterSilence, &ScenarioReader::adapter_silence},
 }};
 
 constexpr std::chrono::microseconds no_time{0};
@@ -107,6 +115,9 @@ std::vector<PlacedAdapter> read_placed_adapters(TomlTable& root) {
 Scenario ScenarioReader::read(TomlTable root) {
   read_networks(root);
   read_cluster(root);
+  read_routes(root);
+  read_client_heartbeat(root);
+  read_answers(root);
   read_events(root);
   read_churn(root);
   root.finish();
@@ -116,7 +127,8 @@ Scenario ScenarioReader::read(TomlTable root) {
 void ScenarioReader::read_networks(TomlTable& root) {
   auto& networks = scenario_.configuration.networks;
   for (TomlTable& table : root.tables("network", "[[network]]")) {
-    Network network{table.text("name", HB_NETWORK_NAME_LENGTH - 1), table.text("type", HB_NETWORK_TYPE_LENGTH - 1, "")};
+    Network network{table.text("name", HB_NETWORK_NAME_LENGTH - 1), table.text("type", HB_NETWORK_TYPE_LENGTH - 1, ""),
+                    table.truth("ip", true)};
     if (std::any_of(networks.begin(), networks.end(), [&](const auto& each) { return each.name == network.name; })) {
       table.refuse("name", "is that of an earlier network; give each its own");
     }
@@ -135,6 +147,8 @@ void ScenarioReader::read_cluster(TomlTable& root) {
   configuration.name = cluster.text("name", HB_NAME_LENGTH - 1, "cluster");
   configuration.remote_node_down_period = timeval_of(cluster.duration("remote_node_down_simulation", no_time));
   configuration.local_node_down_period = timeval_of(cluster.duration("local_node_down_simulation", no_time));
+  scenario_.control.suspicion =
+      std::chrono::ceil<std::chrono::milliseconds>(cluster.duration("suspicion", scenario_.control.suspicion));
   read_limits(cluster, adapters);
   configuration.local_node =
       static_cast<Hb_Node_Number>(cluster.number("local_node", 0, configuration.max_nodes - 1, 0));
@@ -230,6 +244,72 @@ Hb_Adapter_Number ScenarioReader::read_configured_adapter(TomlTable& table) {
 std::vector<Hb_Adapter_Number> ScenarioReader::adapters_of(int node) const {
   return {configured_.lower_bound(scenario_.configuration.adapter_number(node, 0)),
           configured_.lower_bound(scenario_.configuration.adapter_number(node + 1, 0))};
+}
+
+void ScenarioReader::read_routes(TomlTable& root) {
+  for (TomlTable& table : root.tables("route", "[[route]]")) {
+    const auto node = static_cast<Hb_Node_Number>(read_node(table));
+    Route route;
+    for (const auto& [text, line] : table.texts("hops")) {
+      const auto hop = parse_address(text);
+      if (!hop) {
+        throw ScenarioMistake{line,
+                              fmt::format("[[route]] \"hops\" has \"{}\", which is no IPv4 or IPv6 address", text)};
+      }
+      route.hops.push_back(*hop);
+    }
+    if (route.hops.empty() || route.hops.size() > HB_ROUTE_HOPS) {
+      table.refuse("hops", fmt::format("must be 1 to {} addresses, the node's own at the end", int{HB_ROUTE_HOPS}));
+    }
+    route.ip = table.truth("ip", true);
+    table.finish();
+    if (!scenario_.configuration.given_routes.emplace(node, std::move(route)).second) {
+      table.refuse("node", fmt::format("is {} again; a node has one route", node));
+    }
+  }
+}
+
+void ScenarioReader::read_client_heartbeat(TomlTable& root) {
+  TomlTable table = root.table("client_heartbeat", "[client_heartbeat]");
+  HeartbeatAnswer& answer = scenario_.control.heartbeat;
+  answer.is_given = table.truth("answer", true);
+  const timeval threshold = timeval_of(table.duration("threshold", std::chrono::seconds(answer.settings.seconds)));
+  answer.settings.seconds = static_cast<std::int32_t>(threshold.tv_sec);
+  answer.settings.microseconds = static_cast<std::int32_t>(threshold.tv_usec);
+  answer.settings.enabled = table.truth("enabled", true);
+  answer.settings.daemon_pid = static_cast<std::int32_t>(table.number("daemon_pid", 1, INT32_MAX, 0));
+  table.finish();
+}
+
+/* What a name of a list stands for. */
+template <typename Value, std::size_t Size>
+Value read_name(TomlTable& table, std::string_view key, const ScenarioName<Value> (&list)[Size]) {
+  const std::string name = table.text(key, 64);
+  std::string all;
+  for (const auto& each : list) {
+    if (each.name == name) {
+      return each.value;
+    }
+    all += fmt::format("{}{}", all.empty() ? "" : ", ", each.name);
+  }
+  table.refuse(key, fmt::format("is \"{}\"; it must be one of: {}", name, all));
+}
+
+void ScenarioReader::read_answers(TomlTable& root) {
+  for (TomlTable& table : root.tables("answer", "[[answer]]")) {
+    ScriptedAnswer answer;
+    answer.request = read_name(table, "request", scripted_requests);
+    answer.status = read_name(table, "status", scripted_statuses);
+    answer.count = static_cast<std::uint64_t>(table.number("count", 0, INT64_MAX, 1));
+    if (table.has("state")) {
+      answer.state = read_name(table, "state", scripted_states);
+      if (answer.request != HB_GET_ADAPTER_STATE || answer.status != HB_REQUEST_SUCCESSFUL) {
+        table.refuse("state", "goes with the request \"adapter-state\" and the status \"successful\" alone");
+      }
+    }
+    table.finish();
+    scenario_.control.answers.push_back(answer);
+  }
 }
 
 void ScenarioReader::read_events(TomlTable& root) {

@@ -26,6 +26,7 @@ class Simulation : public MembershipSource {
   void set_audience(Audience& audience);
 
   [[nodiscard]] Configuration configuration() const override { return scenario_.configuration; }
+  [[nodiscard]] ControlSettings control_settings() const override { return scenario_.control; }
   void start(ChangeSink& sink, const Cluster& cluster) override;
 
  private:

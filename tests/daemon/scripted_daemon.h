@@ -14,11 +14,13 @@
 /** Runs hbd on the small cluster. The script ends with a failure-data identifier "end" that tests wait for. */
 class ScriptedDaemon {
  public:
-  /** @param subscriptions how many subscriptions start the script, the one of go() included. */
-  explicit ScriptedDaemon(const std::string& script = "", int subscriptions = 2)
-      : process_(directory_, {"--socket", socket(), "--scenario",
-                              directory_.write("scenario.toml", small_cluster + script + end_of_script),
-                              "--as-fast-as-read", "--start-after-subscriptions", std::to_string(subscriptions)}) {
+  /**
+   * @param subscriptions how many subscriptions start the script, the one of go() included.
+   * @param cluster what the script is played on.
+   */
+  explicit ScriptedDaemon(const std::string& script = "", int subscriptions = 2,
+                          const std::string& cluster = small_cluster, const std::vector<std::string>& more = {})
+      : process_(directory_, arguments(script, subscriptions, cluster, more)) {
     EXPECT_TRUE(process_.wait_until_ready()) << process_.log();
   }
 
@@ -50,6 +52,20 @@ class ScriptedDaemon {
   }
 
  private:
+  [[nodiscard]] std::vector<std::string> arguments(const std::string& script, int subscriptions,
+                                                   const std::string& cluster,
+                                                   const std::vector<std::string>& more) const {
+    std::vector<std::string> words = {"--socket",
+                                      socket(),
+                                      "--scenario",
+                                      directory_.write("scenario.toml", cluster + script + end_of_script),
+                                      "--as-fast-as-read",
+                                      "--start-after-subscriptions",
+                                      std::to_string(subscriptions)};
+    words.insert(words.end(), more.begin(), more.end());
+    return words;
+  }
+
   static constexpr const char* end_of_script = "\n[[event]]\nat = \"1h\"\nkind = \"ffdc-id\"\nid = \"end\"\n";
 
   TemporaryDirectory directory_;
