@@ -56,6 +56,7 @@ TEST_P(EveryOperation, FailsAsTheStartDoesAndSendsNothingWhileNothingIsPublished
   EXPECT_TRUE(fails_with(33, call));
   EXPECT_FALSE(daemon.accept().has_input());
   EXPECT_TRUE(operation_outputs.untouched());
+  hb_terminate();  // such a start keeps its connection
 }
 
 TEST_P(EveryOperation, FailsInVexModeWithoutClusterServicesAndSetsNoErrorNumber) {
