@@ -137,25 +137,26 @@ SocketFile::~SocketFile() {
   }
 }
 
-Claim::Claim(Loop& loop, const std::string& path, const memory_configuration_data& configuration) : path_(path) {
+Claim::Claim(Loop& loop, const std::string& path, const Publication& publication, std::chrono::milliseconds patience)
+    : path_(path), patience_(patience) {
   const auto directory = directory_of(path);
   make_directories(directory);
   const Descriptor lock = lock_directory(directory);
   clear_stale(path);
-  bind_and_publish(loop, configuration);
+  bind_and_publish(loop, publication);
   if (listen(socket_.get(), backlog) != 0) {
     throw failure("listening at", path, "give another path with --socket");
   }
 }
 
 /* Keys hold 16 bits of the inode only: when others use them, another socket file has other ones. */
-void Claim::bind_and_publish(Loop& loop, const memory_configuration_data& configuration) {
+void Claim::bind_and_publish(Loop& loop, const Publication& publication) {
   SetAside set_aside;
   for (;;) {
     bind_socket();
     remove_stale_objects(path_);
     try {
-      publisher_ = std::make_unique<Publisher>(loop, path_, configuration);
+      publisher_ = std::make_unique<Publisher>(loop, path_, publication, patience_);
       return;
     } catch (const KeyTaken& taken) {
       spdlog::debug("{}", taken.what());

@@ -34,9 +34,10 @@ class Claim {
   /**
    * Clears what a killed daemon left, and refuses to start beside a live one.
    *
+   * @param patience see Publisher.
    * @throws Failure when the path cannot be had.
    */
-  Claim(Loop& loop, const std::string& path, const memory_configuration_data& configuration);
+  Claim(Loop& loop, const std::string& path, const Publication& publication, std::chrono::milliseconds patience);
   Claim(const Claim&) = delete;
   Claim& operator=(const Claim&) = delete;
   ~Claim() = default;
@@ -45,10 +46,11 @@ class Claim {
   Publisher& publisher() { return *publisher_; }
 
  private:
-  void bind_and_publish(Loop& loop, const memory_configuration_data& configuration);
+  void bind_and_publish(Loop& loop, const Publication& publication);
   void bind_socket();
 
   std::string path_;
+  std::chrono::milliseconds patience_;
   Descriptor socket_;
   std::unique_ptr<SocketFile> file_;
   std::unique_ptr<Publisher> publisher_;

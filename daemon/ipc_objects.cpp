@@ -81,4 +81,6 @@ bool SemaphoreSet::is_zero(unsigned short index) const {
   return semop(id_, &operation, 1) == 0 || errno != EAGAIN;
 }
 
+pid_t SemaphoreSet::last_process(unsigned short index) const { return semctl(id_, index, GETPID); }
+
 }  // namespace hbd

@@ -49,6 +49,8 @@ class SemaphoreSet {
   void add(unsigned short index, short amount) const;
   /** Whether one semaphore is 0 now. */
   [[nodiscard]] bool is_zero(unsigned short index) const;
+  /** The process that changed one semaphore last. */
+  [[nodiscard]] pid_t last_process(unsigned short index) const;
 
  private:
   int id_;

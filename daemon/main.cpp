@@ -85,6 +85,7 @@ void tell_ready(int descriptor) {
 void serve(hbd::Loop& loop, const hbd::Options& options, hbd::MembershipSource& source, hbd::Daemon& daemon) {
   const hbd::Signal terminate(loop, SIGTERM, [&] { loop.stop(); });
   const hbd::Signal interrupt(loop, SIGINT, [&] { loop.stop(); });
+  const hbd::Signal rotate(loop, SIGUSR1, [&] { daemon.rotate_keys(); });
   source.start(daemon, daemon.cluster());
   spdlog::info("listening at {}", options.socket_path);
   tell_ready(options.ready_descriptor);

@@ -75,6 +75,15 @@ void add_service_options(CLI::App& app, Options& options) {
   add_duration(app, "--stale-age", options.service.stale_age,
                "Drop events of this age that wait for a client which has asked to be told nothing stale")
       ->default_str("10s");
+  add_duration(app, "--reader-patience", options.service.reader_patience,
+               "Report a reader that is inside the shared segments for longer")
+      ->default_str("1s");
+  app.add_option("--key-file", options.service.key_file,
+                 "Take the security key from this file, which nobody but the daemon's user may read; without it keys "
+                 "are made at random")
+      ->type_name("FILE");
+  add_duration(app, "--key-rotation", options.service.key_rotation,
+               "Change the security key so often; SIGUSR1 does so at any time");
   app.add_option("--ready-fd", options.ready_descriptor,
                  "Write one byte to this descriptor and close it when clients can connect")
       ->type_name("N")

@@ -39,7 +39,8 @@ extern "C" key_t __wrap_ftok(const char* path, int project) {
 
 namespace {
 
-constexpr memory_configuration_data published{1, 4, 8};
+const hbd::Publication published{{1, 4, 8}, {}};
+constexpr std::chrono::milliseconds patience{1000};
 
 class Keys : public testing::Test {
  protected:
@@ -82,7 +83,7 @@ class Keys : public testing::Test {
 TEST_F(Keys, that_are_taken_leave_no_object_of_an_attempt_behind) {
   path_ = directory_.write("file", "");
   occupy(HB_SECURITY_SEGMENT_ID, 3168);
-  EXPECT_THROW(hbd::Publisher(loop_, path_, published), hbd::KeyTaken);
+  EXPECT_THROW(hbd::Publisher(loop_, path_, published, patience), hbd::KeyTaken);
   EXPECT_EQ(semget(first_key + HB_SEMAPHORE_SET_ID, 0, 0), -1);
   EXPECT_EQ(shmget(first_key + HB_CONFIGURATION_SEGMENT_ID, 0, 0), -1);
   EXPECT_EQ(shmget(first_key + HB_ROUTE_SEGMENT_ID, 0, 0), -1);
@@ -91,7 +92,7 @@ TEST_F(Keys, that_are_taken_leave_no_object_of_an_attempt_behind) {
 
 TEST_F(Keys, that_are_taken_by_a_live_process_make_the_socket_file_be_made_anew) {
   occupy(HB_ROUTE_SEGMENT_ID, std::size_t{4} * 184);
-  const hbd::Claim claim(loop_, path_, published);
+  const hbd::Claim claim(loop_, path_, published, patience);
   EXPECT_TRUE(is_there(foreign_[0]));
   EXPECT_NE(shmget(first_key + 256 + HB_ROUTE_SEGMENT_ID, 0, 0), -1);
   EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory_.path("")), {}), 1);
@@ -100,13 +101,13 @@ TEST_F(Keys, that_are_taken_by_a_live_process_make_the_socket_file_be_made_anew)
 TEST_F(Keys, that_stay_taken_end_in_a_failure_that_leaves_no_file) {
   all_files_share_keys = true;
   occupy(HB_ROUTE_SEGMENT_ID, std::size_t{4} * 184);
-  EXPECT_THROW(hbd::Claim(loop_, path_, published), hbd::Failure);
+  EXPECT_THROW(hbd::Claim(loop_, path_, published, patience), hbd::Failure);
   EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory_.path("")), {}), 0);
 }
 
 TEST_F(Keys, of_objects_whose_maker_is_gone_are_taken_over) {
   const int left = leave_behind(HB_CONFIGURATION_SEGMENT_ID, 12);
-  const hbd::Claim claim(loop_, path_, published);
+  const hbd::Claim claim(loop_, path_, published, patience);
   EXPECT_FALSE(is_there(left));
   EXPECT_NE(shmget(first_key + HB_CONFIGURATION_SEGMENT_ID, 12, 0), -1);
 }
@@ -114,7 +115,7 @@ TEST_F(Keys, of_objects_whose_maker_is_gone_are_taken_over) {
 TEST_F(Keys, of_objects_of_another_shape_are_left_alone_although_the_maker_is_gone) {
   all_files_share_keys = true;
   foreign_.push_back(leave_behind(HB_CONFIGURATION_SEGMENT_ID, 13));
-  EXPECT_THROW(hbd::Claim(loop_, path_, published), hbd::Failure);
+  EXPECT_THROW(hbd::Claim(loop_, path_, published, patience), hbd::Failure);
   EXPECT_TRUE(is_there(foreign_[0]));
 }
 
@@ -128,7 +129,7 @@ TEST_F(Keys, of_a_semaphore_set_without_segments_are_taken_over_when_all_who_tou
   waitpid(child, nullptr, 0);
   const int left = semget(first_key + HB_SEMAPHORE_SET_ID, 0, 0);
   ASSERT_NE(left, -1);
-  const hbd::Claim claim(loop_, path_, published);
+  const hbd::Claim claim(loop_, path_, published, patience);
   EXPECT_EQ(semctl(left, 0, GETVAL), -1);
 }
 
@@ -137,7 +138,7 @@ TEST_F(Keys, of_the_semaphores_of_a_live_process_are_left_alone) {
   const int id = semget(first_key + HB_SEMAPHORE_SET_ID, 2, IPC_CREAT | 0600);
   std::array<sembuf, 2> both = {{{0, 1, 0}, {1, 1, 0}}};
   ASSERT_EQ(semop(id, both.data(), both.size()), 0);
-  EXPECT_THROW(hbd::Claim(loop_, path_, published), hbd::Failure);
+  EXPECT_THROW(hbd::Claim(loop_, path_, published, patience), hbd::Failure);
   EXPECT_EQ(semctl(id, 0, GETVAL), 1);
   semctl(id, 0, IPC_RMID);
 }

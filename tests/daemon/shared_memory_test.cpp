@@ -1,11 +1,11 @@
 /* The writer's side of the reader lock, seen by a reader. */
 #include <gmock/gmock.h>
-#include <sys/ipc.h>
-#include <sys/sem.h>
-#include <sys/shm.h>
+#include <unistd.h>
 
 #include <array>
+#include <csignal>
 
+#include "published_segments.h"
 #include "scripted_daemon.h"
 
 namespace {
@@ -14,39 +14,17 @@ const std::string removal =
     "[[event]]\nat = \"1s\"\nkind = \"configuration-update\"\nremove = [{ node = 2 }]\n"
     "[[event]]\nat = \"2s\"\nkind = \"configuration-update\"\nremove = [{ node = 0, offset = 1 }]\n";
 
-/* The published configuration and the reader lock, as a client has them. */
-class Reader {
+/* The published configuration with the reader lock. */
+class Reader : public ReaderLock {
  public:
-  explicit Reader(const std::string& socket)
-      : semaphores_(semget(ftok(socket.c_str(), 105), 2, 0)),
-        published_(static_cast<const volatile std::uint32_t*>(
-            shmat(shmget(ftok(socket.c_str(), 103), 12, 0), nullptr, SHM_RDONLY))) {}
-  Reader(const Reader&) = delete;
-  Reader& operator=(const Reader&) = delete;
-  ~Reader() { shmdt(const_cast<const std::uint32_t*>(published_)); }
+  explicit Reader(const std::string& socket) : ReaderLock(socket), published_(socket, 103) {}
 
-  void enter() const {
-    std::array<sembuf, 2> operations = {{{0, 1, SEM_UNDO}, {1, 0, 0}}};
-    ASSERT_EQ(semop(semaphores_, operations.data(), operations.size()), 0);
-  }
-  void leave() const {
-    sembuf operation{0, -1, SEM_UNDO};
-    ASSERT_EQ(semop(semaphores_, &operation, 1), 0);
-  }
-  /* Waits until no writer holds the lock. */
-  void wait_for_writer() const {
-    sembuf operation{1, 0, 0};
-    const timespec patience{20, 0};
-    ASSERT_EQ(semtimedop(semaphores_, &operation, 1, &patience), 0);
-  }
-  [[nodiscard]] int value(int semaphore) const { return semctl(semaphores_, semaphore, GETVAL); }
-  [[nodiscard]] std::uint32_t sequence() const { return published_[0]; }
-  [[nodiscard]] std::uint32_t nodes() const { return published_[1]; }
-  [[nodiscard]] std::uint32_t adapters() const { return published_[2]; }
+  [[nodiscard]] std::uint32_t sequence() const { return published_.word(0); }
+  [[nodiscard]] std::uint32_t nodes() const { return published_.word(4); }
+  [[nodiscard]] std::uint32_t adapters() const { return published_.word(8); }
 
  private:
-  int semaphores_;
-  const volatile std::uint32_t* published_;
+  PublishedSegment published_;
 };
 
 TEST(PublishedConfiguration, has_a_new_number_after_each_update) {
@@ -84,9 +62,8 @@ TEST(PublishedConfiguration, keeps_new_readers_out_while_it_waits) {
   const Reader reader(daemon.socket());
   reader.enter();
   daemon.follow(SubscriptionType::AllAdapters, 1);
-  const int semaphores = semget(ftok(daemon.socket().c_str(), 105), 2, 0);
   std::array<sembuf, 2> second = {{{0, 1, IPC_NOWAIT}, {1, 0, IPC_NOWAIT}}};
-  EXPECT_EQ(semop(semaphores, second.data(), second.size()), -1);
+  EXPECT_EQ(semop(reader.id(), second.data(), second.size()), -1);
   reader.leave();
   reader.wait_for_writer();
 }
@@ -106,6 +83,40 @@ TEST(Stopping, does_not_wait_for_a_reader_that_is_inside) {
   reader.enter();
   daemon.follow(SubscriptionType::AllAdapters, 1);
   EXPECT_EQ(daemon.process().stop(), 0);
+}
+
+TEST(Writer, that_is_killed_while_it_waits_leaves_no_lock) {
+  ScriptedDaemon daemon(removal);
+  const Reader reader(daemon.socket());
+  reader.enter();
+  daemon.follow(SubscriptionType::AllAdapters, 1);
+  EXPECT_EQ(reader.value(1), 1);
+  daemon.process().signal(SIGKILL);
+  daemon.process().wait_for_end();
+  EXPECT_EQ(reader.value(1), 0);
+  EXPECT_EQ(reader.value(0), 1);
+  reader.leave();
+}
+
+TEST(Writer, reports_a_reader_that_is_too_long_inside_and_waits_for_it_all_the_same) {
+  ScriptedDaemon daemon(removal, 2, small_cluster, {"--reader-patience", "20ms"});
+  const Reader reader(daemon.socket());
+  reader.enter();
+  Connection client(daemon.socket());
+  client.subscribe(SubscriptionType::AllAdapters, 1, "s");
+  daemon.go(client);
+  /* The daemon serves its clients meanwhile. */
+  while (daemon.process().log().find("a reader has been inside") == std::string::npos) {
+    ASSERT_TRUE(client.configuration());
+  }
+  EXPECT_THAT(daemon.process().log(), testing::ContainsRegex("a reader has been inside the shared segments for [0-9]+ "
+                                                             "ms, process " +
+                                                             std::to_string(getpid())));
+  EXPECT_EQ(reader.sequence(), 1U);
+  EXPECT_EQ(reader.value(0), 1);
+  reader.leave();
+  reader.wait_for_writer();
+  EXPECT_EQ(reader.sequence(), 3U);
 }
 
 }  // namespace

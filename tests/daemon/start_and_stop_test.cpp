@@ -96,8 +96,9 @@ TEST_F(Daemon, publishes_segments_of_the_prescribed_sizes_with_valid_contents) {
   const auto daemon = start({"--scenario", directory_.write("s.toml", small_cluster)});
   const Objects objects(socket_);
   EXPECT_EQ(contents_of(objects.segments[0]), ByteWriter().u32(1).u32(4).u32(5).bytes());
-  EXPECT_EQ(contents_of(objects.segments[1]), Bytes(std::size_t{4} * 184));
-  EXPECT_EQ(contents_of(objects.segments[2]), Bytes(3168));
+  /* Routes and keys have tests of their own. */
+  EXPECT_EQ(contents_of(objects.segments[1]).size(), std::size_t{4} * 184);
+  EXPECT_EQ(contents_of(objects.segments[2]).size(), 3168U);
 }
 
 TEST_F(Daemon, publishes_two_semaphores_that_are_both_0) {
@@ -118,7 +119,7 @@ TEST_F(Daemon, guards_what_it_publishes_by_modes) {
   EXPECT_EQ(state_of(objects.segments[2]).shm_perm.mode & 0777, 0640);
   semid_ds state{};
   semctl(objects.semaphores, 0, IPC_STAT, &state);
-  EXPECT_EQ(state.sem_perm.mode & 0777, 0666);
+  EXPECT_EQ(state.sem_perm.mode & 0777, 0660);
   struct stat file {};
   ASSERT_EQ(lstat(socket_.c_str(), &file), 0);
   EXPECT_EQ(file.st_mode & 07777, 0660U);
