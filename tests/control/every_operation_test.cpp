@@ -56,7 +56,8 @@ TEST_P(EveryOperation, FailsAsTheStartDoesAndSendsNothingWhileNothingIsPublished
   EXPECT_TRUE(fails_with(33, call));
   EXPECT_FALSE(daemon.accept().has_input());
   EXPECT_TRUE(operation_outputs.untouched());
-  hb_terminate();  // such a start keeps its connection
+  hb_remove_client_select();  // such a start keeps its connection
+  hb_remove_socket();
 }
 
 TEST_P(EveryOperation, FailsInVexModeWithoutClusterServicesAndSetsNoErrorNumber) {

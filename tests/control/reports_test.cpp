@@ -56,7 +56,7 @@ class ReportAbout : public Steering, public testing::WithParamInterface<Report<N
 
   // The daemon reads meanwhile: no socket holds the largest requests.
   testing::AssertionResult reports(Number number) {
-    const Bytes expected = request_with_number(GetParam().code, number);
+    const Bytes expected = request_with_number(GetParam().code, static_cast<int32_t>(number));
     Bytes received;
     daemon.run([&](FakeDaemon&) { received = connection.receive_raw(expected.size()); });
     const testing::AssertionResult result = succeeds([&] { return GetParam().call(number); });

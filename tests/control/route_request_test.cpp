@@ -2,6 +2,8 @@
 #include <gtest/gtest.h>
 #include <sys/socket.h>
 
+#include <utility>
+
 #include "core/scripted_socket.h"
 #include "route_outputs.h"
 #include "steering.h"
@@ -66,9 +68,11 @@ TEST_F(RouteRequest, TakesTheFirst176BytesOfTheMessage) {
 }
 
 TEST_F(RouteRequest, KeepsTheLow16BitsOfTheLength) {
-  for (const auto& [value, length] : {std::pair(0x12345, 0x2345), std::pair(65536, 0), std::pair(-1, 65535),
-                                      std::pair(-2147483647 - 1, 0), std::pair(65535, 65535)}) {
-    EXPECT_TRUE(succeeds([&] { return ask_with(answer(value, some_hops())); })) << value;
+  const std::pair<int32_t, int> lengths[] = {
+      {0x12345, 0x2345}, {65536, 0}, {-1, 65535}, {-2147483647 - 1, 0}, {65535, 65535}};
+  for (const auto& [value, length] : lengths) {
+    const Bytes packet = answer(value, some_hops());
+    EXPECT_TRUE(succeeds([&] { return ask_with(packet); })) << value;
     EXPECT_EQ(length, out.length) << value;
   }
 }
