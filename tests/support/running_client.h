@@ -31,7 +31,11 @@ inline void reset_platform(uint8_t trace_level = 0) {
 
 class RunningClient : public testing::Test {
  protected:
-  explicit RunningClient(const ConfigurationMessage& configuration = small_cluster(), uint8_t trace_level = 0) {
+  explicit RunningClient(const ConfigurationMessage& configuration = small_cluster(), uint8_t trace_level = 0)
+      : RunningClient(Publication(), configuration, trace_level) {}
+
+  RunningClient(const Publication& publication, const ConfigurationMessage& configuration, uint8_t trace_level = 0)
+      : daemon(publication) {
     std::signal(SIGPIPE, SIG_IGN);
     reset_platform(trace_level);
     connection = start_client(daemon, configuration);

@@ -1,0 +1,258 @@
+// Readers and writers of the published routes that are killed inside the lock: it stays free, and no reader takes a
+// route that was half written.
+#include <gtest/gtest.h>
+#include <sched.h>
+#include <sys/mman.h>
+#include <sys/prctl.h>
+#include <sys/sem.h>
+#include <sys/shm.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <cerrno>
+#include <csignal>
+#include <cstring>
+#include <functional>
+#include <new>
+#include <random>
+
+#include "hb_client/route.h"
+#include "queries/test_cluster.h"
+#include "support/running_client.h"
+
+namespace hb_test {
+namespace {
+
+constexpr int reader_kills = 10000;
+constexpr int writer_kills = 1000;
+constexpr uint32_t nodes = 8;
+constexpr int readers_semaphore = 0;
+constexpr int writer_semaphore = 1;
+
+// What the processes of a test tell each other.
+struct Progress {
+  std::atomic<uint64_t> reads = 0;
+  std::atomic<uint64_t> accepted = 0;
+  std::atomic<uint64_t> torn = 0;
+  std::atomic<uint64_t> written = 0;
+  std::atomic<bool> ends = false;
+};
+
+// In memory that child processes share.
+class Shared_Progress {
+ public:
+  Shared_Progress() {
+    void* memory = mmap(nullptr, sizeof(Progress), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+    if (memory == MAP_FAILED) throw std::bad_alloc();
+    progress_ = new (memory) Progress;
+  }
+  ~Shared_Progress() { munmap(progress_, sizeof(Progress)); }
+  Shared_Progress(const Shared_Progress&) = delete;
+  Shared_Progress& operator=(const Shared_Progress&) = delete;
+
+  Progress* operator->() const { return progress_; }
+  Progress& operator*() const { return *progress_; }
+
+ private:
+  Progress* progress_;
+};
+
+// The last hop of a route is made of all the others, so that bytes of two routes do not fit together.
+void seal(uint32_t (&words)[44]) {
+  uint32_t sum = 0x811C9DC5;
+  for (size_t i = 0; i < 40; ++i) sum = (sum ^ words[i]) * 0x01000193;
+  for (size_t i = 40; i < 44; ++i) words[i] = sum + static_cast<uint32_t>(i);
+}
+
+bool is_sealed(const Hb_Source_Route& route) {
+  uint32_t words[44];
+  std::memcpy(words, &route, sizeof words);
+  uint32_t sealed[44];
+  std::memcpy(sealed, words, sizeof sealed);
+  seal(sealed);
+  return std::memcmp(words, sealed, sizeof words) == 0;
+}
+
+// The daemon's side of the lock and of the two segments, by the numbers.
+class Writer {
+ public:
+  explicit Writer(FakeDaemon& daemon)
+      : semaphores_(daemon.semaphore_id()),
+        configuration_(attach(daemon.segment_id(Segment::configuration))),
+        routes_(attach(daemon.segment_id(Segment::route))) {}
+
+  // Rewrites all routes so many times inside the lock.
+  void publish(int times) {
+    operate(writer_semaphore, 1, SEM_UNDO);
+    operate(readers_semaphore, 0, 0);
+    for (int i = 0; i < times; ++i) rewrite();
+    operate(writer_semaphore, -1, SEM_UNDO);
+  }
+
+ private:
+  static volatile uint32_t* attach(int id) { return static_cast<volatile uint32_t*>(shmat(id, nullptr, 0)); }
+
+  void operate(unsigned short semaphore, short change, short flags) const {
+    sembuf operation = {semaphore, change, flags};
+    while (semop(semaphores_, &operation, 1) != 0 && errno == EINTR) {
+    }
+  }
+
+  // The number goes first and comes back last: what lies between is valid to nobody.
+  void rewrite() {
+    configuration_[0] = 0;
+    std::atomic_thread_fence(std::memory_order_seq_cst);
+    const uint32_t number = ++number_ == 0 ? ++number_ : number_;
+    for (uint32_t node = 0; node < nodes; ++node) {
+      uint32_t words[44];
+      for (uint32_t& word : words) word = (seed_ = seed_ * 1664525 + 1013904223);
+      seal(words);
+      volatile uint32_t* route = routes_ + node * 46;
+      route[0] = number;
+      route[1] = 36;
+      for (size_t i = 0; i < 44; ++i) route[2 + i] = words[i];
+    }
+    std::atomic_thread_fence(std::memory_order_seq_cst);
+    configuration_[0] = number;
+  }
+
+  int semaphores_;
+  volatile uint32_t* configuration_;
+  volatile uint32_t* routes_;
+  uint32_t number_ = 0;
+  uint32_t seed_ = static_cast<uint32_t>(getpid());
+};
+
+// A process that a test kills, or that ends by itself.
+class Child {
+ public:
+  explicit Child(const std::function<void()>& work) : pid_(fork()) {
+    if (pid_ == 0) {
+      prctl(PR_SET_PDEATHSIG, SIGKILL);
+      work();
+      _exit(0);
+    }
+  }
+  ~Child() {
+    if (pid_ > 0) kill_and_wait();
+  }
+  Child(const Child&) = delete;
+  Child& operator=(const Child&) = delete;
+
+  void kill_and_wait() {
+    ::kill(pid_, SIGKILL);
+    wait();
+  }
+  // The exit status, or -1 when a signal ended it.
+  int wait() {
+    int status = 0;
+    waitpid(pid_, &status, 0);
+    pid_ = -1;
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+  }
+  void stop() const {
+    ::kill(pid_, SIGSTOP);
+    int status = 0;
+    waitpid(pid_, &status, WUNTRACED);
+  }
+  void go_on() const { ::kill(pid_, SIGCONT); }
+
+ private:
+  pid_t pid_;
+};
+
+class KilledProcesses : public RunningClient {
+ protected:
+  KilledProcesses() : RunningClient(Publication::for_nodes(nodes), sparse_cluster()) {}
+
+  int semaphore(int number) { return semctl(daemon.semaphore_id(), number, GETVAL); }
+
+  // Until it is told to end; every route that is taken has to be whole.
+  void read_routes() {
+    Hb_Source_Route route;
+    unsigned short length = 0;
+    for (Hb_Node_Number node = 0; !progress->ends; node = static_cast<Hb_Node_Number>((node + 1) % int{nodes})) {
+      if (hb_read_route(node, &route, &length) == Hb_Success) {
+        progress->accepted++;
+        if (!is_sealed(route) || length != 36) progress->torn++;
+      }
+      progress->reads++;
+    }
+  }
+
+  // Until it is told to end; a read is let through before the next writing.
+  void write_routes(int times) {
+    Writer writer(daemon);
+    while (!progress->ends) {
+      const uint64_t before = progress->reads;
+      writer.publish(times);
+      progress->written++;
+      while (progress->reads == before && !progress->ends) sched_yield();
+    }
+  }
+
+  // Lets other processes run until the count is above the value.
+  static void await_above(const std::atomic<uint64_t>& count, uint64_t value) {
+    while (count <= value) sched_yield();
+  }
+
+  // Up to some tens of microseconds, in which a child gets to any place of its loop.
+  void pass_a_moment() {
+    const uint64_t turns = random_() % 20000;
+    for (uint64_t turn = 0; turn < turns; ++turn) std::atomic_signal_fence(std::memory_order_seq_cst);
+  }
+
+  void expect_free_lock() {
+    EXPECT_EQ(0, semaphore(readers_semaphore));
+    EXPECT_EQ(0, semaphore(writer_semaphore));
+  }
+
+  Shared_Progress progress;
+
+ private:
+  std::minstd_rand random_{4711};
+};
+
+TEST_F(KilledProcesses, ReadersLeaveNoHoldAndNoTornRouteIsTaken) {
+  Child writer([this] { write_routes(1); });
+  await_above(progress->written, 0);
+  for (int i = 0; i < reader_kills; ++i) {
+    const uint64_t before = progress->reads;
+    Child reader([this] { read_routes(); });
+    await_above(progress->reads, before);
+    pass_a_moment();
+    reader.kill_and_wait();
+  }
+  progress->ends = true;
+  EXPECT_EQ(0, writer.wait());
+  expect_free_lock();
+  EXPECT_EQ(0U, progress->torn);
+  EXPECT_GE(progress->reads, uint64_t{reader_kills});
+  EXPECT_GT(progress->accepted, 0U);
+}
+
+TEST_F(KilledProcesses, WritersLeaveTheLockFreeAndNoHalfWrittenRouteIsTaken) {
+  Child reader([this] { read_routes(); });
+  int kills = 0;
+  while (kills < writer_kills) {
+    const uint64_t before = progress->written;
+    Child writer([this] { write_routes(20); });
+    await_above(progress->written, before);
+    pass_a_moment();
+    writer.stop();
+    kills += semaphore(writer_semaphore);
+    writer.kill_and_wait();
+    EXPECT_EQ(0, semaphore(writer_semaphore));
+  }
+  const uint64_t reads = progress->reads;
+  await_above(progress->reads, reads + nodes);
+  progress->ends = true;
+  EXPECT_EQ(0, reader.wait());
+  expect_free_lock();
+  EXPECT_EQ(0U, progress->torn);
+  EXPECT_GT(progress->accepted, 0U);
+}
+
+}  // namespace
+}  // namespace hb_test
