@@ -50,8 +50,7 @@ class ReportAbout : public Steering, public testing::WithParamInterface<Report<N
   using testing::WithParamInterface<Report<Number>>::GetParam;
 
   testing::AssertionResult is_refused_with(int error, Number number) {
-    const testing::AssertionResult result = fails_with(error, [&] { return GetParam().call(number); });
-    return result ? nothing_sent() : result;
+    return refuses(error, [&] { return GetParam().call(number); });
   }
 
   // The daemon reads meanwhile: no socket holds the largest requests.

@@ -32,8 +32,7 @@ class RoutedMessage : public Steering {
   }
 
   testing::AssertionResult is_refused_with(int error, const std::vector<iovec>& buffers) {
-    const testing::AssertionResult result = fails_with(error, [&] { return route(buffers); });
-    return result ? nothing_sent() : result;
+    return refuses(error, [&] { return route(buffers); });
   }
 
   // A request for port 80 in the other byte order, to those nodes, with that body.

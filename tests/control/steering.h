@@ -2,6 +2,7 @@
 #pragma once
 
 #include <gtest/gtest.h>
+#include <sys/socket.h>
 #include <unistd.h>
 
 #include <cstring>
@@ -54,6 +55,15 @@ class Steering : public RunningClient {
   explicit Steering(const ConfigurationMessage& configuration = sparse_cluster()) : RunningClient(configuration) {}
 
   testing::AssertionResult sent(const Bytes& frame) { return sends(connection, frame); }
+
+  // The call fails with that error and sends nothing. There is no answer: one that is awaited all the same would be for
+  // ever, but for the end of the stream.
+  template <typename Call>
+  testing::AssertionResult refuses(int error, Call call) {
+    shutdown(connection.descriptor(), SHUT_WR);
+    const testing::AssertionResult result = fails_with(error, call);
+    return result ? nothing_sent() : result;
+  }
 
   testing::AssertionResult nothing_sent() const {
     return connection.has_input() ? testing::AssertionFailure() << "something was sent" : testing::AssertionSuccess();
