@@ -22,14 +22,24 @@ bool is_special(Hb_IP_address4 address) {
 
 }  // namespace
 
-/* A network has one adapter in a node; of several it is the lowest. */
+/* A network has one adapter in a node; of several it is the first with an IPv4 address, as requests carry such. */
 const Adapter* AdapterControl::find(Hb_Network_Number network) const {
   const Configuration& configuration = cluster_.configuration();
   const auto& adapters = configuration.adapters;
   const auto end = adapters.lower_bound(configuration.adapter_number(configuration.local_node + 1, 0));
-  const auto found = std::find_if(adapters.lower_bound(configuration.adapter_number(configuration.local_node, 0)), end,
-                                  [&](const auto& each) { return each.second.network == network; });
-  return found == end ? nullptr : &found->second;
+  const Adapter* first = nullptr;
+  for (auto each = adapters.lower_bound(configuration.adapter_number(configuration.local_node, 0)); each != end;
+       ++each) {
+    const Adapter& adapter = each->second;
+    if (adapter.network != network) {
+      continue;
+    }
+    if (IN6_IS_ADDR_V4MAPPED(&adapter.address.i6_ipv6)) {
+      return &adapter;
+    }
+    first = first == nullptr ? &adapter : first;
+  }
+  return first;
 }
 
 const Adapter* AdapterControl::find(const Hb_IP_address6& address) const {
@@ -155,11 +165,12 @@ Hb_Request_Status AdapterControl::state(const AdapterTarget& target, Hb_Adapter_
   if (status != HB_REQUEST_SUCCESSFUL) {
     return status;
   }
-  const Hb_Adapter_Number number = find(target.network)->number;
-  if (!cluster_.has_address(number)) {
+  const Adapter& adapter = *find(target.network);
+  if (!cluster_.has_address(adapter.number)) {
     return HB_ADAPTER_NOT_CONFIG;
   }
-  state = cluster_.state(number);
+  const bool is_off = cluster_.is_monitored(adapter.number) && interfaces_.is_switched_off(adapter);
+  state = is_off ? Hb_Adapter_ifconfig_Down : cluster_.state(adapter.number);
   return HB_REQUEST_SUCCESSFUL;
 }
 

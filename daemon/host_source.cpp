@@ -9,6 +9,7 @@ namespace hbd {
 HostSource::HostSource(Loop& loop)
     : table_(HostMonitor::read_all()),
       cluster_(table_),
+      interfaces_(table_),
       poll_(loop, monitor_.descriptor(), [this](int) { take_changes(); }) {}
 
 void HostSource::start(ChangeSink& sink, const Cluster& /*cluster*/) {

@@ -3,6 +3,7 @@
 #define HBD_HOST_SOURCE_H
 
 #include "host_cluster.h"
+#include "host_interfaces.h"
 #include "loop.h"
 #include "membership_source.h"
 #include "rtnetlink.h"
@@ -15,6 +16,7 @@ class HostSource : public MembershipSource {
   explicit HostSource(Loop& loop);
 
   [[nodiscard]] Configuration configuration() const override { return cluster_.configuration(); }
+  InterfaceControl* interfaces() override { return &interfaces_; }
   void start(ChangeSink& sink, const Cluster& cluster) override;
 
  private:
@@ -23,6 +25,7 @@ class HostSource : public MembershipSource {
   HostMonitor monitor_; /* listens before the table is read, so that nothing is missed in between */
   HostTable table_;
   HostCluster cluster_;
+  HostInterfaces interfaces_;
   ChangeSink* sink_ = nullptr;
   Poll poll_;
 };

@@ -4,6 +4,7 @@
 #include <linux/if_link.h>
 #include <linux/rtnetlink.h>
 #include <net/if.h>
+#include <netinet/in.h>
 
 #include <cstring>
 #include <optional>
@@ -71,6 +72,12 @@ std::optional<Hb_IP_address6> address_of(const nlattr* attribute, unsigned char 
 
 }  // namespace
 
+bool HostAddress::is_ipv4() const {
+  in6_addr address{};
+  std::memcpy(&address, bytes.data(), bytes.size());
+  return IN6_IS_ADDR_V4MAPPED(&address);
+}
+
 void HostTable::take(const nlmsghdr& message) {
   switch (message.nlmsg_type) {
     case RTM_NEWLINK:
@@ -98,7 +105,8 @@ void HostTable::take_link(const nlmsghdr& message) {
   }
   Interface& interface = interfaces_[link->ifi_index];
   interface.hardware = link->ifi_type;
-  interface.running = (link->ifi_flags & IFF_UP) != 0 && (link->ifi_flags & IFF_RUNNING) != 0;
+  interface.on = (link->ifi_flags & IFF_UP) != 0;
+  interface.running = interface.on && (link->ifi_flags & IFF_RUNNING) != 0;
   mnl_attr_parse(&message, sizeof(ifinfomsg), take_name, &interface.name);
 }
 
@@ -116,12 +124,12 @@ void HostTable::take_address(const nlmsghdr& message) {
   if (!address) {
     return;
   }
-  HostAddress entry{static_cast<int>(header->ifa_index), {}};
+  HostAddress entry{static_cast<int>(header->ifa_index), {}, header->ifa_prefixlen};
   std::memcpy(entry.bytes.data(), &*address, entry.bytes.size());
+  /* One that is there already may have another prefix now. */
+  addresses_.erase(entry);
   if (message.nlmsg_type == RTM_NEWADDR && (attributes.flags & unusable) == 0) {
     addresses_.insert(entry);
-  } else {
-    addresses_.erase(entry);
   }
 }
 

@@ -19,6 +19,7 @@ namespace hbd {
 struct Interface {
   std::string name;
   std::uint16_t hardware = 0; /**< its kind, an ARPHRD number */
+  bool on = false;            /**< switched on */
   bool running = false;       /**< switched on and with a carrier */
 };
 
@@ -26,6 +27,9 @@ struct Interface {
 struct HostAddress {
   int interface = 0;
   std::array<std::uint8_t, 16> bytes{}; /**< as in `Hb_IP_address6` */
+  unsigned char prefix_length = 0;      /**< of its network, in bits; it makes no other address */
+
+  [[nodiscard]] bool is_ipv4() const;
 
   bool operator<(const HostAddress& other) const {
     return std::tie(interface, bytes) < std::tie(other.interface, other.bytes);

@@ -23,6 +23,8 @@ class InterfaceControl {
   virtual Hb_Request_Status unconfigure(const Adapter& adapter) = 0;
   /** Exchanges the addresses of two adapters. */
   virtual Hb_Request_Status swap(const Adapter& adapter, const Adapter& partner) = 0;
+  /** Whether the adapter's interface is switched off, as far as the cluster does not know it by itself. */
+  [[nodiscard]] virtual bool is_switched_off(const Adapter& adapter) const = 0;
 };
 
 }  // namespace hbd

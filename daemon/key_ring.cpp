@@ -63,7 +63,8 @@ bool KeyRing::rotate() {
   make_room();
   put_little_endian(key.value + version_at, ++version_);
   Hb_Shared_Security_Status& current = keys_.current_sec_status;
-  current = {Hb_True, 1, Hb_False, Hb_True, Hb_True, key};
+  current = {Hb_True, 1, Hb_False, Hb_True, Hb_True, {}};
+  current.key = key; /* by itself: no copy of it stays behind on the stack */
   keys_.sequence_number += keys_.sequence_number == UINT32_MAX ? 2 : 1;
   return true;
 }

@@ -116,7 +116,7 @@ Packet configuration_packet(Hb_Client_Reply kind, const Cluster& cluster) {
   header.local_node_down_sim_period = configuration.local_node_down_period;
   packet.put(header);
   for (const auto& [number, adapter] : configuration.adapters) {
-    put_adapter(packet, adapter, cluster.up_adapters().contains(number));
+    put_adapter(packet, adapter, cluster.up_adapters().contains(number) && cluster.has_address(number));
   }
   for (const auto& network : configuration.networks) {
     put_network(packet, network);

@@ -20,9 +20,7 @@ constexpr int semaphore_mode = 0660;
 
 /* While it is 0 nothing beside it is valid. So nobody takes what a daemon has left that was killed while it wrote. */
 void set_number(Hb_Sequence_Number& number, Hb_Sequence_Number value) {
-  std::atomic_thread_fence(std::memory_order_release);
-  std::atomic_ref(number).store(value, std::memory_order_release);
-  std::atomic_thread_fence(std::memory_order_seq_cst);
+  std::atomic_ref(number).exchange(value, std::memory_order_acq_rel);
 }
 
 }  // namespace

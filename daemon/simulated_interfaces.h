@@ -16,6 +16,7 @@ class SimulatedInterfaces : public InterfaceControl {
   Hb_Request_Status configure(const Adapter& adapter, const Hb_IP_address6& address) override;
   Hb_Request_Status unconfigure(const Adapter& adapter) override;
   Hb_Request_Status swap(const Adapter& adapter, const Adapter& partner) override;
+  [[nodiscard]] bool is_switched_off(const Adapter& /*adapter*/) const override { return false; }
 
  private:
   ChangeSink& sink_;

@@ -155,6 +155,7 @@ TEST_F(AdapterRequest, that_takes_its_address_leaves_it_unconfigured_until_it_ge
   const auto update = client_.receive();
   ASSERT_EQ(next_kind(update), 9U);
   EXPECT_EQ(address_of_record(*update, 2), Bytes(16));
+  EXPECT_EQ(state_of_record(*update, 2), 2U);
   EXPECT_EQ(status(unconfigure, public_network), answer(configured, 4));
   EXPECT_EQ(status(swap_addresses, public_network, address4(192, 0, 2, 1)), answer(configured, 4));
   EXPECT_EQ(status(state, public_network), answer(14, 4));
@@ -162,6 +163,7 @@ TEST_F(AdapterRequest, that_takes_its_address_leaves_it_unconfigured_until_it_ge
   const auto second = client_.receive();
   ASSERT_EQ(next_kind(second), 9U);
   EXPECT_EQ(address_of_record(*second, 2), mapped(192, 0, 2, 2));
+  EXPECT_EQ(state_of_record(*second, 2), 1U);
   EXPECT_EQ(status(state, public_network), state_answer(2).bytes());
 }
 

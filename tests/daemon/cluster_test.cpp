@@ -146,4 +146,88 @@ TEST(Cluster, takes_new_networks_before_new_adapters) {
   EXPECT_TRUE(cluster.network_is_available(2));
 }
 
+/* Adapters that the only event of a kind names. */
+std::vector<Hb_Adapter_Number> named(const std::vector<Event>& events, hbd::Direction direction) {
+  std::vector<Hb_Adapter_Number> numbers;
+  for (const auto& event : events) {
+    const auto* adapters = std::get_if<AdapterEvent>(&event.body);
+    if (adapters != nullptr && adapters->direction == direction) {
+      for (const auto& entry : adapters->adapters) {
+        numbers.push_back(entry.adapter);
+      }
+    }
+  }
+  return numbers;
+}
+
+TEST(UnmonitoredAdapter, keeps_the_state_that_was_told_of_it) {
+  Cluster cluster(three_nodes());
+  EXPECT_THAT(cluster.apply(hbd::MonitoringSwitch{2, false}), IsEmpty());
+  EXPECT_THAT(cluster.apply(hbd::AdapterDeath{{2}}), IsEmpty());
+  EXPECT_THAT(named(cluster.apply(hbd::NetworkLoss{0}), hbd::Direction::Death), ElementsAre(0, 4));
+  EXPECT_TRUE(cluster.up_adapters().contains(2));
+  EXPECT_EQ(cluster.state(2), Hb_Adapter_Not_Monitored);
+  EXPECT_THAT(named(cluster.apply(hbd::MonitoringSwitch{2, true}), hbd::Direction::Death), ElementsAre(2));
+}
+
+TEST(UnmonitoredAdapter, does_not_keep_its_node_alive) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::MonitoringSwitch{4, false});
+  EXPECT_THAT(kinds(cluster.apply(hbd::NodeDeath{2, {}})), ElementsAre(node_event, node_group));
+  EXPECT_THAT(members(cluster.up_nodes()), ElementsAre(0, 1));
+}
+
+TEST(UnmonitoredAdapter, goes_with_the_configuration_and_comes_back_monitored) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::MonitoringSwitch{2, false});
+  EXPECT_THAT(named(cluster.apply(hbd::ConfigurationChange{{2}, {}, {}}), hbd::Direction::Death), ElementsAre(2));
+  cluster.apply(hbd::ConfigurationChange{{}, {}, {Adapter{2, {}, 0, "", true}}});
+  EXPECT_TRUE(cluster.is_monitored(2));
+}
+
+TEST(Grace, holds_a_death_back_and_nothing_else) {
+  Cluster cluster(three_nodes());
+  cluster.apply(hbd::GraceSwitch{2, true});
+  EXPECT_THAT(cluster.apply(hbd::AdapterDeath{{2}}), IsEmpty());
+  EXPECT_THAT(named(cluster.apply(hbd::GraceSwitch{2, false}), hbd::Direction::Death), ElementsAre(2));
+  cluster.apply(hbd::GraceSwitch{2, true});
+  EXPECT_THAT(named(cluster.apply(hbd::AdapterJoin{{2}}), hbd::Direction::Join), ElementsAre(2));
+}
+
+TEST(Silence, is_noticed_by_suspicion_alone) {
+  Cluster cluster(three_nodes());
+  EXPECT_THAT(cluster.apply(hbd::AdapterSilence{{2}}), IsEmpty());
+  EXPECT_THAT(named(cluster.apply(hbd::SuspicionEnd{{0, 2, 4}}), hbd::Direction::Death), ElementsAre(2));
+  EXPECT_THAT(cluster.apply(hbd::SuspicionEnd{{0, 2, 7}}), IsEmpty());
+}
+
+TEST(Monitor, under_manual_control_leaves_the_state_to_requests) {
+  auto configuration = three_nodes();
+  configuration.local_node = 1;
+  configuration.adapters[2].type = "en0";
+  configuration.adapters[0].type = "en0";
+  Cluster cluster(configuration);
+  cluster.apply(hbd::ManualControl{"en0", true});
+  EXPECT_TRUE(cluster.is_under_manual_control("en0"));
+  EXPECT_THAT(named(cluster.apply(hbd::NetworkLoss{0}), hbd::Direction::Death), ElementsAre(0, 4));
+  cluster.apply(hbd::NetworkReturn{0});
+  EXPECT_THAT(named(cluster.apply(hbd::InterfaceSwitch{2, false}), hbd::Direction::Death), ElementsAre(2));
+  EXPECT_EQ(cluster.state(2), Hb_Adapter_ifconfig_Down);
+  EXPECT_THAT(named(cluster.apply(hbd::InterfaceSwitch{2, true}), hbd::Direction::Join), ElementsAre(2));
+  EXPECT_THAT(named(cluster.apply(hbd::ReportedDeath{{2}}), hbd::Direction::Death), ElementsAre(2));
+  EXPECT_THAT(cluster.apply(hbd::AdapterJoin{{2}}), IsEmpty());
+  EXPECT_THAT(named(cluster.apply(hbd::ManualControl{"en0", false}), hbd::Direction::Join), ElementsAre(2));
+}
+
+TEST(Address, that_is_taken_away_takes_the_adapter_down_until_there_is_another) {
+  Cluster cluster(three_nodes());
+  EXPECT_THAT(kinds(cluster.apply(hbd::AddressChange{{{2, std::nullopt}}})),
+              ElementsAre(adapter_event, configuration_event, adapter_group));
+  EXPECT_FALSE(cluster.has_address(2));
+  EXPECT_EQ(cluster.configuration_sequence(), 2U);
+  EXPECT_THAT(kinds(cluster.apply(hbd::AddressChange{{{2, Hb_IP_address6{}}}})),
+              ElementsAre(configuration_event, adapter_event, adapter_group));
+  EXPECT_EQ(cluster.configuration_sequence(), 3U);
+}
+
 }  // namespace

@@ -55,12 +55,14 @@ void link(HostTable& table, int index, const std::string& name, unsigned flags, 
   table.take(message.header());
 }
 
-void address(HostTable& table, int index, const std::string& text, unsigned type = RTM_NEWADDR, unsigned flags = 0) {
+void address(HostTable& table, int index, const std::string& text, unsigned type = RTM_NEWADDR, unsigned flags = 0,
+             unsigned prefix = 24) {
   const bool six = text.find(':') != std::string::npos;
   Message message(type);
   auto& header = message.extra<ifaddrmsg>();
   header.ifa_family = six ? AF_INET6 : AF_INET;
   header.ifa_index = static_cast<unsigned>(index);
+  header.ifa_prefixlen = static_cast<unsigned char>(prefix);
   std::array<std::uint8_t, 16> bytes{};
   inet_pton(header.ifa_family, text.c_str(), bytes.data());
   message.put(six ? IFA_ADDRESS : IFA_LOCAL, bytes.data(), six ? 16 : 4);
@@ -83,11 +85,15 @@ TEST(HostTable, takes_name_kind_and_state_of_an_interface) {
   HostTable table;
   link(table, 3, "en0", running);
   link(table, 1, "lo", IFF_UP, ARPHRD_LOOPBACK);
-  ASSERT_EQ(table.interfaces().size(), 2U);
+  link(table, 2, "en1", IFF_RUNNING);
+  ASSERT_EQ(table.interfaces().size(), 3U);
   EXPECT_EQ(table.interfaces().at(3).name, "en0");
   EXPECT_TRUE(table.interfaces().at(3).running);
   EXPECT_EQ(table.interfaces().at(1).hardware, ARPHRD_LOOPBACK);
+  EXPECT_TRUE(table.interfaces().at(1).on);
   EXPECT_FALSE(table.interfaces().at(1).running);
+  EXPECT_FALSE(table.interfaces().at(2).on);
+  EXPECT_FALSE(table.interfaces().at(2).running);
 }
 
 TEST(HostTable, takes_addresses_of_both_families_and_forgets_them) {
@@ -97,6 +103,25 @@ TEST(HostTable, takes_addresses_of_both_families_and_forgets_them) {
   EXPECT_THAT(addresses(table), testing::UnorderedElementsAre("3 192.0.2.1", "3 2001:db8::1"));
   address(table, 3, "192.0.2.1", RTM_DELADDR);
   EXPECT_THAT(addresses(table), ElementsAre("3 2001:db8::1"));
+}
+
+TEST(HostTable, takes_the_prefix_of_an_address_whenever_it_is_told) {
+  HostTable table;
+  address(table, 3, "192.0.2.1", RTM_NEWADDR, 0, 24);
+  ASSERT_EQ(table.addresses().size(), 1U);
+  EXPECT_EQ(table.addresses().begin()->prefix_length, 24);
+  address(table, 3, "192.0.2.1", RTM_NEWADDR, 0, 28);
+  ASSERT_EQ(table.addresses().size(), 1U);
+  EXPECT_EQ(table.addresses().begin()->prefix_length, 28);
+}
+
+TEST(HostTable, tells_families_apart) {
+  HostTable table;
+  address(table, 3, "192.0.2.1");
+  address(table, 4, "2001:db8::ffff:192.0.2.1");
+  ASSERT_EQ(table.addresses().size(), 2U);
+  EXPECT_TRUE(table.addresses().begin()->is_ipv4());
+  EXPECT_FALSE(table.addresses().rbegin()->is_ipv4());
 }
 
 TEST(HostTable, forgets_the_addresses_of_an_interface_that_is_gone) {

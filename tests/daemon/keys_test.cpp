@@ -1,6 +1,7 @@
 /* The security keys that the daemon publishes. */
 #include <gmock/gmock.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <csignal>
 
@@ -199,6 +200,19 @@ TEST_F(Keys, of_what_is_no_file_keep_the_daemon_from_starting) {
     EXPECT_EQ(daemon.wait_for_end(), 1);
     EXPECT_THAT(daemon.log(), HasSubstr("the key file " + file));
   }
+}
+
+TEST_F(Keys, of_another_user_keep_the_daemon_from_starting) {
+  /* Only the superuser can give a file away; to everybody else the superuser is another user. */
+  const bool is_superuser = geteuid() == 0;
+  const std::string file = is_superuser ? key_file("secret") : "/etc/passwd";
+  if (is_superuser) {
+    ASSERT_EQ(chown(file.c_str(), 1, 1), 0);
+  }
+  DaemonProcess daemon(directory_, arguments({"--key-file", file}));
+  EXPECT_FALSE(daemon.wait_until_ready());
+  EXPECT_EQ(daemon.wait_for_end(), 1);
+  EXPECT_THAT(daemon.log(), HasSubstr("hbd: the key file " + file + " belongs to user " + (is_superuser ? "1" : "0")));
 }
 
 }  // namespace

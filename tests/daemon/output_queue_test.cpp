@@ -7,6 +7,7 @@
 
 #include <array>
 #include <cerrno>
+#include <chrono>
 
 #include "wire.h"
 
@@ -94,6 +95,34 @@ TEST_F(Queue, refuses_a_frame_beyond_the_bound_and_counts_what_is_left_only) {
   EXPECT_EQ(queue_.size(), kept);
   EXPECT_EQ(queue_.push(sockets_[0], frame_of(112), name_, kept + 112), Result::Kept);
   EXPECT_EQ(queue_.size(), kept + 112);
+}
+
+TEST_F(Queue, drops_events_of_before_a_time_but_no_answer_and_nothing_that_is_sent_in_part) {
+  using std::chrono::milliseconds;
+  const auto large = frame_of(100000);
+  const auto answer = frame_of(112);
+  const auto late = frame_of(113);
+  ASSERT_EQ(queue_.push(sockets_[0], large, name_, 1000000, milliseconds(1)), Result::Kept);
+  ASSERT_EQ(queue_.push(sockets_[0], frame_of(114), name_, 1000000, milliseconds(4)), Result::Kept);
+  ASSERT_EQ(queue_.push(sockets_[0], answer, name_, 1000000), Result::Kept);
+  ASSERT_EQ(queue_.push(sockets_[0], late, name_, 1000000, milliseconds(5)), Result::Kept);
+  const std::size_t before = queue_.size();
+  EXPECT_EQ(queue_.drop_told_before(milliseconds(5)), 1U);
+  EXPECT_EQ(queue_.size(), before - 114);
+
+  Bytes received;
+  for (auto result = Result::Kept; result == Result::Kept || received.size() < 100225;) {
+    const Bytes more = read_what_is_there();
+    received.insert(received.end(), more.begin(), more.end());
+    result = queue_.flush(sockets_[0]);
+    ASSERT_NE(result, Result::Broken);
+  }
+  Bytes expected;
+  for (const auto& frame : {large, answer, late}) {
+    const Bytes bytes = with_name(frame, name_);
+    expected.insert(expected.end(), bytes.begin(), bytes.end());
+  }
+  EXPECT_EQ(received, expected);
 }
 
 TEST_F(Queue, tells_a_broken_connection_without_a_signal) {

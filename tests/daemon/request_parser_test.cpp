@@ -69,6 +69,42 @@ TEST(RequestParser, takes_the_highest_adapter_number_of_a_set) {
   EXPECT_FALSE(request.subscription.members.contains(98352));
 }
 
+TEST(RequestParser, reads_the_network_and_the_value_of_a_request_about_an_adapter) {
+  const auto target = std::get<hbd::AdapterTarget>(
+      parsed<hbd::PlainRequest>(packet(214, {0x01, 0x02, 0xFF, 0xFF, 0xC0, 0x00, 0x02, 0x07})).data);
+  EXPECT_EQ(target.network, 0x0201);
+  EXPECT_EQ(target.value, 0x070200C0U);
+  const auto bare = std::get<hbd::AdapterTarget>(parsed<hbd::PlainRequest>(packet(207, {0xFE, 0xFF})).data);
+  EXPECT_EQ(bare.network, -2);
+  EXPECT_EQ(bare.value, 0U);
+}
+
+TEST(RequestParser, reads_numbers_and_names_from_the_data) {
+  EXPECT_EQ(std::get<std::uint32_t>(parsed<hbd::PlainRequest>(packet(222, {0x78, 0x56, 0x34, 0x12})).data),
+            0x12345678U);
+  EXPECT_EQ(std::get<std::string>(parsed<hbd::PlainRequest>(packet(225, {'e', 'n', '0'})).data), "en0");
+  EXPECT_EQ(std::get<std::string>(parsed<hbd::PlainRequest>(packet(226, {})).data), "");
+}
+
+TEST(RequestParser, reads_every_field_of_a_routed_message) {
+  const auto message = std::get<hbd::RoutingMessage>(parsed<hbd::PlainRequest>(packet(221, ByteWriter()
+                                                                                               .u32(0x0201)
+                                                                                               .u32(20)
+                                                                                               .u32(1)
+                                                                                               .zeros(36)
+                                                                                               .u32(0)
+                                                                                               .u32(2)
+                                                                                               .u32(0)
+                                                                                               .u32(2048)
+                                                                                               .u32(3)
+                                                                                               .raw({7, 8, 9})
+                                                                                               .bytes()))
+                                                         .data);
+  EXPECT_EQ(message.port, 0x0102);
+  EXPECT_EQ(message.nodes, (std::vector<std::int32_t>{0, 2048}));
+  EXPECT_EQ(message.bytes, (Bytes{7, 8, 9}));
+}
+
 TEST(RequestParser, refuses_packets_that_are_shorter_than_a_header) {
   const Bytes whole = packet(201, {});
   for (std::size_t size = 0; size < 76; ++size) {

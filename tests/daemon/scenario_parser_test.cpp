@@ -149,6 +149,8 @@ TEST_P(ScenarioMistake, is_told_with_its_line_and_what_to_do) {
   EXPECT_EQ(error->text, GetParam().message);
 }
 
+std::string with_answer(const std::string& keys) { return small_cluster + "[[answer]]\n" + keys; }
+
 /* Lines of events start behind the cluster's 33 lines. */
 std::string with_event(const std::string& keys) { return small_cluster + "[[event]]\nat = \"1s\"\n" + keys; }
 
@@ -158,7 +160,7 @@ INSTANTIATE_TEST_SUITE_P(
         Mistake{"no_node", "[cluster]\nname = \"x\"\n", 0,
                 "no node has an adapter; add [[node]] tables with a number and adapters"},
         Mistake{"unknown_key", "[[network]]\nname = \"a\"\nspeed = 1\n", 3,
-                "[[network]] has an unknown key \"speed\"; the keys are: name, type"},
+                "[[network]] has an unknown key \"speed\"; the keys are: ip, name, type"},
         Mistake{"missing_key", "[[node]]\nnumber = 0\nadapters = [{ offset = 0 }]\n", 3,
                 "an adapter has no \"network\"; add it"},
         Mistake{"unknown_network",
@@ -182,7 +184,8 @@ INSTANTIATE_TEST_SUITE_P(
                 "[[network]] \"name\" must be a text of 1 to 69 characters"},
         Mistake{"unknown_kind", with_event("kind = \"explosion\"\n"), 36,
                 "\"explosion\" is no kind of event; the kinds are: adapter-death, adapter-join, node-death, node-join, "
-                "network-loss, network-return, configuration-update, ffdc-id, different-instance, heartbeat"},
+                "network-loss, network-return, configuration-update, ffdc-id, different-instance, heartbeat, "
+                "adapter-silence"},
         Mistake{"adapter_that_is_not_there", with_event("kind = \"adapter-death\"\nnode = 2\noffset = 1\n"), 38,
                 "[[event]] \"offset\" is 1, where node 2 has no adapter at that time; add it before"},
         Mistake{"node_that_is_not_there", with_event("kind = \"node-death\"\nnode = 3\n"), 37,
@@ -195,6 +198,25 @@ INSTANTIATE_TEST_SUITE_P(
                 "[[event]] \"at\" must be a length of time in quotes, as \"250ms\", \"1.5s\" or \"2m\""},
         Mistake{"identifier_too_long", with_event("kind = \"ffdc-id\"\nid = \"" + std::string(43, 'i') + "\"\n"), 37,
                 "[[event]] \"id\" must be a text of 1 to 42 characters"},
+        Mistake{"route_without_hops", small_cluster + "[[route]]\nnode = 0\nhops = []\n", 36,
+                "[[route]] \"hops\" must be 1 to 11 addresses, the node's own at the end"},
+        Mistake{"route_of_no_address", small_cluster + "[[route]]\nnode = 0\nhops = [\"::1\", \"x\"]\n", 36,
+                "[[route]] \"hops\" has \"x\", which is no IPv4 or IPv6 address"},
+        Mistake{"route_twice",
+                small_cluster + "[[route]]\nnode = 0\nhops = [\"::1\"]\n[[route]]\nnode = 0\nhops = [\"::2\"]\n", 38,
+                "[[route]] \"node\" is 0 again; a node has one route"},
+        Mistake{"route_beyond_the_nodes", small_cluster + "[[route]]\nnode = 4\nhops = [\"::1\"]\n", 35,
+                "[[route]] \"node\" must be a whole number from 0 to 3"},
+        Mistake{"answer_to_no_request", with_answer("request = \"subscribe\"\nstatus = \"try-again\"\n"), 35,
+                "[[answer]] \"request\" is \"subscribe\"; it must be one of: configure-adapter, unconfigure-adapter, "
+                "swap-adapters, adapter-grace, adapter-state"},
+        Mistake{"answer_of_no_status", with_answer("request = \"adapter-grace\"\nstatus = \"maybe\"\n"), 36,
+                "[[answer]] \"status\" is \"maybe\"; it must be one of: successful, no-such-network, try-again, "
+                "adapter-enabled, adapter-not-configured, invalid-service-address, same-address, not-supported, "
+                "grace-failed, grace-timed-out"},
+        Mistake{"answer_with_a_state_that_is_not_sent",
+                with_answer("request = \"adapter-state\"\nstatus = \"try-again\"\nstate = \"up\"\n"), 37,
+                "[[answer]] \"state\" goes with the request \"adapter-state\" and the status \"successful\" alone"},
         Mistake{"churn_without_time", small_cluster + "[random]\nseed = 1\nmean_interval = \"0s\"\n", 36,
                 "[random] \"mean_interval\" must be longer than 0"},
         Mistake{"local_node_without_adapter",
@@ -206,6 +228,36 @@ INSTANTIATE_TEST_SUITE_P(
                 "2049 nodes with 49 adapters each are 100401 adapter numbers; 98352 are the most, use lower node "
                 "numbers or offsets"}),
     [](const auto& each) { return each.param.name; });
+
+TEST(Scenario, says_how_requests_are_taken) {
+  std::string text = small_cluster + R"(
+[client_heartbeat]
+threshold = "1500ms"
+enabled = false
+[[answer]]
+request = "adapter-state"
+status = "successful"
+state = "no-monitor"
+[[answer]]
+request = "swap-adapters"
+status = "try-again"
+count = 0
+)";
+  text.insert(text.find("local_node ="), "suspicion = \"2s\"\n");
+  const auto control = scenario_of(text).control;
+  EXPECT_EQ(control.suspicion, 2s);
+  EXPECT_TRUE(control.heartbeat.is_given);
+  EXPECT_EQ(control.heartbeat.settings.seconds, 1);
+  EXPECT_EQ(control.heartbeat.settings.microseconds, 500000);
+  EXPECT_FALSE(control.heartbeat.settings.enabled);
+  ASSERT_EQ(control.answers.size(), 2U);
+  EXPECT_EQ(control.answers[0].request, HB_GET_ADAPTER_STATE);
+  EXPECT_EQ(control.answers[0].state, Hb_Adapter_No_NIM);
+  EXPECT_EQ(control.answers[0].count, 1U);
+  EXPECT_EQ(control.answers[1].status, HB_TRY_AGAIN);
+  EXPECT_EQ(control.answers[1].count, 0U);
+  EXPECT_EQ(scenario_of(small_cluster).control.suspicion, 1s);
+}
 
 TEST(ScenarioThatIsNoToml, is_told_with_its_line) {
   const auto result = parse_scenario("[cluster]\nname = \"x\n");

@@ -4,6 +4,7 @@
 
 #include <filesystem>
 #include <memory>
+#include <utility>
 
 #include "daemon_process.h"
 #include "scripted_daemon.h"
@@ -96,6 +97,50 @@ TEST(Client, is_turned_away_while_no_descriptor_is_free_and_the_others_are_serve
   EXPECT_TRUE(last.configuration());
   Connection next(directory.path("socket"));
   EXPECT_TRUE(next.configuration());
+}
+
+/* New groups that come to a client which starts to read now, up to the answer to its last request. */
+std::size_t groups_that_come(Connection& late) {
+  late.send(request(201, {}));
+  std::size_t groups = 0;
+  std::uint32_t last = 0;
+  for (auto packet = late.receive(); packet && field(*packet, 0) != 0; packet = late.receive()) {
+    EXPECT_GT(field(*packet, 104), last);
+    last = field(*packet, 104);
+    groups += field(*packet, 0) == 4 ? 1 : 0;
+  }
+  return groups;
+}
+
+/* Groups of two clients that start to read when all has happened; the second one has never asked to drop anything. */
+std::pair<std::size_t, std::size_t> groups_of_late_readers(std::uint32_t request_before) {
+  const TemporaryDirectory directory;
+  DaemonProcess daemon(
+      directory, {"--socket", directory.path("socket"), "--scenario", directory.write("s.toml", two_thousand_steps),
+                  "--speed", "1e6", "--start-after-subscriptions", "3", "--stale-age", "1ms"});
+  EXPECT_TRUE(daemon.wait_until_ready());
+  Connection late(directory.path("socket"));
+  late.send(request(219, {}));
+  late.send(request(request_before, {}));
+  late.subscribe(SubscriptionType::AllAdapters, 7, "late");
+  Connection patient(directory.path("socket"));
+  patient.subscribe(SubscriptionType::AllAdapters, 7, "patient");
+  Connection other(directory.path("socket"));
+  other.subscribe(SubscriptionType::AllAdapters, 4, "other");
+  for (int groups = 0; groups < 2001 && other.receive(); ++groups) {
+  }
+  const std::size_t groups = groups_that_come(late);
+  return {groups, groups_that_come(patient)};
+}
+
+TEST(StaleEvents, are_dropped_for_a_client_that_has_asked_so_alone_and_answers_are_not) {
+  const auto [asked, patient] = groups_of_late_readers(219);
+  EXPECT_LT(asked, 2001U);
+  EXPECT_EQ(patient, 2001U);
+}
+
+TEST(StaleEvents, are_kept_for_a_client_that_wants_them_again) {
+  EXPECT_EQ(groups_of_late_readers(220), std::pair(std::size_t{2001}, std::size_t{2001}));
 }
 
 TEST(AsFastAsRead, loses_nothing_for_a_client_that_starts_to_read_late) {

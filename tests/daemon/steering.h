@@ -46,4 +46,9 @@ inline Bytes address_of_record(const Bytes& configuration, std::size_t n) {
   return {start, start + 16};
 }
 
+/** Its state: 1 is up, 2 is down. */
+inline std::uint32_t state_of_record(const Bytes& configuration, std::size_t n) {
+  return field(configuration, 108 + 52 + n * 64 + 60);
+}
+
 #endif
