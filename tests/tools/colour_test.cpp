@@ -1,13 +1,11 @@
 // Colour on a terminal, and nowhere else.
-#include <fcntl.h>
 #include <gmock/gmock.h>
-#include <poll.h>
-#include <unistd.h>
 
 #include <cstdlib>
 
 #include "hbctl_process.h"
 #include "played_daemon.h"
+#include "terminal.h"
 
 namespace hb_test {
 namespace {
@@ -17,44 +15,12 @@ using testing::Not;
 
 constexpr const char* kGreenUp = "\033[32mup\033[0m";
 
-// A terminal that the test reads from.
-class Terminal {
- public:
-  Terminal() : outside_(posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC)) {
-    grantpt(outside_);
-    unlockpt(outside_);
-    inside_ = open(ptsname(outside_), O_RDWR | O_NOCTTY | O_CLOEXEC);
-  }
-  ~Terminal() {
-    close(inside_);
-    close(outside_);
-  }
-  int inside() const { return inside_; }
-
-  // What has been written to it so far.
-  std::string read_written() const {
-    std::string text;
-    pollfd entry{outside_, POLLIN, 0};
-    while (poll(&entry, 1, 0) > 0) {
-      char buffer[4096];
-      const ssize_t count = read(outside_, buffer, sizeof buffer);
-      if (count <= 0) break;
-      text.append(buffer, static_cast<size_t>(count));
-    }
-    return text;
-  }
-
- private:
-  int outside_;
-  int inside_;
-};
-
 std::string nodes_on_terminal(const std::vector<std::string>& more = {}) {
   PlayedDaemon daemon;
-  const Terminal terminal;
+  Terminal terminal;
   std::vector<std::string> arguments{"nodes"};
   arguments.insert(arguments.end(), more.begin(), more.end());
-  ChildProcess child(hbctl(arguments), terminal.inside());
+  ChildProcess child(hbctl(arguments), {.output = terminal.descriptor()});
   daemon.start();
   daemon.tell_who_is_up();
   child.finish();

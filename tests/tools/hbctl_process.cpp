@@ -19,12 +19,30 @@ namespace {
 
 constexpr int kPatienceMs = 10000;
 
-struct Pipe {
-  int ends[2];
-  Pipe() {
-    if (pipe2(ends, O_CLOEXEC) != 0) throw std::system_error(errno, std::generic_category(), "pipe2");
+class Descriptor {
+ public:
+  explicit Descriptor(int descriptor = -1) : descriptor_(descriptor) {}
+  ~Descriptor() {
+    if (descriptor_ >= 0) close(descriptor_);
   }
+  Descriptor(const Descriptor&) = delete;
+  Descriptor& operator=(const Descriptor&) = delete;
+
+  int get() const { return descriptor_; }
+  void set(int descriptor) { descriptor_ = descriptor; }
+
+ private:
+  int descriptor_;
 };
+
+// The end to write to, which closes with its owner.
+int make_pipe(int& reading, Descriptor& writing) {
+  int ends[2];
+  if (pipe2(ends, O_CLOEXEC) != 0) throw std::system_error(errno, std::generic_category(), "pipe2");
+  reading = ends[0];
+  writing.set(ends[1]);
+  return ends[1];
+}
 
 // Appends what comes next; false at the end.
 bool read_more(int descriptor, std::string& text) {
@@ -56,31 +74,28 @@ void close_if_open(int& descriptor) {
 
 }  // namespace
 
-ChildProcess::ChildProcess(const std::vector<std::string>& command) {
-  const Pipe output;
-  const Pipe errors;
-  output_ = output.ends[0];
-  errors_ = errors.ends[0];
-  start(command, output.ends[1], errors.ends[1]);
-  close(output.ends[1]);
-  close(errors.ends[1]);
+ChildProcess::ChildProcess(const std::vector<std::string>& command) : ChildProcess(command, Streams()) {}
+
+ChildProcess::ChildProcess(const std::vector<std::string>& command, const Streams& streams) {
+  const Descriptor nothing(open("/dev/null", O_RDONLY | O_CLOEXEC));
+  Descriptor output;
+  Descriptor errors;
+  Streams all = streams;
+  if (all.input < 0) all.input = nothing.get();
+  if (all.output < 0) all.output = make_pipe(output_, output);
+  if (all.errors < 0) all.errors = make_pipe(errors_, errors);
+  start(command, all);
 }
 
-ChildProcess::ChildProcess(const std::vector<std::string>& command, int output) {
-  const Pipe errors;
-  errors_ = errors.ends[0];
-  start(command, output, errors.ends[1]);
-  close(errors.ends[1]);
-}
-
-void ChildProcess::start(const std::vector<std::string>& command, int output, int errors) {
+void ChildProcess::start(const std::vector<std::string>& command, const Streams& streams) {
   std::vector<char*> arguments;
   for (const std::string& argument : command) arguments.push_back(const_cast<char*>(argument.c_str()));
   arguments.push_back(nullptr);
   posix_spawn_file_actions_t actions;
   posix_spawn_file_actions_init(&actions);
-  posix_spawn_file_actions_adddup2(&actions, output, STDOUT_FILENO);
-  posix_spawn_file_actions_adddup2(&actions, errors, STDERR_FILENO);
+  posix_spawn_file_actions_adddup2(&actions, streams.input, STDIN_FILENO);
+  posix_spawn_file_actions_adddup2(&actions, streams.output, STDOUT_FILENO);
+  posix_spawn_file_actions_adddup2(&actions, streams.errors, STDERR_FILENO);
   const int failed = posix_spawn(&pid_, arguments[0], &actions, nullptr, arguments.data(), environ);
   posix_spawn_file_actions_destroy(&actions);
   if (failed != 0) throw std::system_error(failed, std::generic_category(), command[0]);

@@ -1,4 +1,4 @@
-// A command that runs beside the test, with its standard output and standard error in pipes.
+// A command that runs beside the test, with its standard output and standard error in pipes and nothing to read.
 #pragma once
 
 #include <sys/types.h>
@@ -14,14 +14,22 @@ struct Finished {
   std::string errors;
 };
 
+// Descriptors for a command in place of those that it has otherwise; -1 for none.
+struct Streams {
+  int input = -1;
+  int output = -1;
+  int errors = -1;
+};
+
 class ChildProcess {
  public:
   explicit ChildProcess(const std::vector<std::string>& command);
-  // As above, but its standard output is that descriptor.
-  ChildProcess(const std::vector<std::string>& command, int output);
+  ChildProcess(const std::vector<std::string>& command, const Streams& streams);
   ~ChildProcess();
   ChildProcess(const ChildProcess&) = delete;
   ChildProcess& operator=(const ChildProcess&) = delete;
+
+  pid_t pid() const { return pid_; }
 
   // The next line of its output, without the line feed. Waits at most ten seconds, then throws.
   std::string read_line();
@@ -38,7 +46,7 @@ class ChildProcess {
   Finished finish();
 
  private:
-  void start(const std::vector<std::string>& command, int output, int errors);
+  void start(const std::vector<std::string>& command, const Streams& streams);
 
   pid_t pid_ = -1;
   int output_ = -1;

@@ -242,7 +242,7 @@ TEST(HbctlSites, has_an_empty_list_in_json) {
 TEST(HbctlOutput, that_cannot_be_written_is_a_failure) {
   PlayedDaemon daemon;
   const int full = open("/dev/full", O_WRONLY | O_CLOEXEC);
-  ChildProcess child(hbctl({"sites"}), full);
+  ChildProcess child(hbctl({"sites"}), {.output = full});
   daemon.start();
   const Finished finished = child.finish();
   close(full);

@@ -255,8 +255,13 @@ TEST(HbctlWatchInJson, shows_heartbeat_settings_without_the_membership_of_an_ear
   watch.daemon().send(
       ReplyPacket(15).name("hbctl.nodes").sequence(5).message(ByteBuilder().u32(10).u32(0).u32(1).u32(1234).bytes()));
   watch.next();
-  const json expected = {{"version", 1},         {"type", "event"}, {"sequence", 5},
-                         {"event", "heartbeat"}, {"bits", 512},     {"subscription", "hbctl.nodes"}};
+  const json expected = {{"version", 1},
+                         {"type", "event"},
+                         {"sequence", 5},
+                         {"event", "heartbeat"},
+                         {"bits", 512},
+                         {"subscription", "hbctl.nodes"},
+                         {"heartbeat", {{"threshold", 10.0}, {"watched", true}, {"daemon_pid", 1234}}}};
   EXPECT_EQ(watch.next(), expected);
 }
 
@@ -320,7 +325,9 @@ TEST(HbctlWatchInText, shows_the_events_that_are_about_no_member) {
       ReplyPacket(15).name("hbctl.nodes").sequence(5).message(ByteBuilder().u32(10).u32(0).u32(1).u32(1234).bytes()));
   EXPECT_EQ(watch.next(), "       3  -        failure-data        failure data f00d");
   EXPECT_EQ(watch.next(), "       4  -        different-instance  10.9.8.7 runs instance 77");
-  EXPECT_EQ(watch.next(), "       5  -        heartbeat           the daemon's settings for client heartbeats");
+  EXPECT_EQ(watch.next(),
+            "       5  -        heartbeat           client heartbeats: one every 10 s at least, watched, daemon "
+            "process 1234");
 }
 
 TEST(HbctlWatchInText, is_written_while_events_come_and_not_at_the_end) {

@@ -18,8 +18,11 @@ struct CommandEntry {
 };
 
 constexpr CommandEntry kCommands[] = {
-    {"status", status_command},     {"nodes", nodes_command}, {"adapters", adapters_command},
-    {"networks", networks_command}, {"sites", sites_command}, {"watch", watch_command},
+    {"status", status_command},     {"nodes", nodes_command},       {"adapters", adapters_command},
+    {"networks", networks_command}, {"sites", sites_command},       {"watch", watch_command},
+    {"adapter", adapter_command},   {"node", node_command},         {"route", route_command},
+    {"security", security_command}, {"send", send_command},         {"heartbeat", heartbeat_command},
+    {"stale", stale_command},       {"monitors", monitors_command}, {"simulate-death", simulate_death_command},
 };
 
 void run_command(const Context& context) {
@@ -41,7 +44,7 @@ int tell(const CommandError& error) {
 void tell_in_json(const Context& context, const CommandError& error) {
   Json json = json_object("error");
   json["error"] = error_json(error);
-  context.output.write(context.options.command == "watch" ? json_line(json) : json_document(json));
+  context.output.write(json_text(context, json));
 }
 
 int run_reporting(const Context& context) {

@@ -6,6 +6,11 @@
 
 namespace hbctl {
 
+std::string json_text(const Context& context, const Json& json) {
+  const bool several = context.options.command == "watch" || context.options.command == "heartbeat";
+  return several ? json_line(json) : json_document(json);
+}
+
 Cell state_cell(State state) {
   switch (state) {
     case State::Up:

@@ -3,6 +3,7 @@
 
 #include "cluster.h"
 #include "errors.h"
+#include "json.h"
 #include "liveness.h"
 #include "options.h"
 #include "output.h"
@@ -24,6 +25,20 @@ void adapters_command(const Context& context);
 void networks_command(const Context& context);
 void sites_command(const Context& context);
 void watch_command(const Context& context);
+
+// Those that steer the daemon or read what it publishes for programs that do.
+void adapter_command(const Context& context);
+void node_command(const Context& context);
+void route_command(const Context& context);
+void security_command(const Context& context);
+void send_command(const Context& context);
+void heartbeat_command(const Context& context);
+void simulate_death_command(const Context& context);
+void stale_command(const Context& context);
+void monitors_command(const Context& context);
+
+// An object as the command writes it: a document, or a line where it writes several.
+std::string json_text(const Context& context, const Json& json);
 
 // How tables show a state.
 Cell state_cell(State state);

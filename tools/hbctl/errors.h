@@ -12,6 +12,9 @@ enum class ExitStatus : int {
   Usage = 2,         // the command line is wrong
   NotReachable = 3,  // no daemon answers on the socket
   DaemonGone = 4,    // the daemon closed the connection
+  NotConfirmed = 5,  // it is dangerous and nobody agreed to it; nothing was sent
+  Refused = 6,       // the daemon answered that it will not do it
+  Unclear = 7,       // no answer came, or none that tells whether it was done
 };
 
 // Carries what to tell the person, the exit status and, when the library failed, its error number.

@@ -52,6 +52,13 @@ void read_sender(Hb_Group& group, Event& event) {
     event.sender = {address_text(sender.addr), sender.machinesInst};
 }
 
+void read_heartbeat(Event& event) {
+  Hb_client_hb_info_t info{};
+  if (hb_get_client_hb_info(&info) != Hb_Success) return;
+  event.heartbeat = {info.client_hb_thresh.tv_sec + info.client_hb_thresh.tv_usec / 1e6,
+                     info.client_hb_is_enabled == Hb_True, info.client_hb_daemon_pid};
+}
+
 }  // namespace
 
 std::vector<Hb_Adapter_Number> Event::adapter_numbers() const {
@@ -66,6 +73,7 @@ void read_group(Hb_Group& group, Event& event) {
   if (event.bits == HB_EVENT_DEATH || event.bits == HB_EVENT_JOIN || event.bits == HB_EVENT_FFDC_ID)
     read_failure_data(group, event);
   if (event.bits == HB_EVENT_DIFF_INSTANCE) read_sender(group, event);
+  if (event.bits == HB_EVENT_NODE_HEARTBEAT) read_heartbeat(event);
 }
 
 }  // namespace hbctl

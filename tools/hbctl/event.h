@@ -27,6 +27,13 @@ struct Sender {
   Hb_Config_Instance instance;
 };
 
+// What the daemon expects of a client that sends heartbeats.
+struct HeartbeatSettings {
+  double threshold;  // seconds, the longest time between two of them
+  bool watched;      // whether it looks for them
+  int daemon_pid;
+};
+
 enum class Subject { None, Nodes, Adapters };
 
 struct Event {
@@ -41,6 +48,7 @@ struct Event {
   std::optional<GroupIdentity> identity;  // new groups of adapters
   std::optional<std::string> failure_data;
   std::optional<Sender> sender;  // different instance
+  std::optional<HeartbeatSettings> heartbeat;
 
   std::vector<Hb_Adapter_Number> adapter_numbers() const;
 };

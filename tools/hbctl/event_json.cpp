@@ -52,6 +52,10 @@ void add_configuration(Json& json, const WatchState& state) {
 
 }  // namespace
 
+Json heartbeat_json(const HeartbeatSettings& settings) {
+  return {{"threshold", settings.threshold}, {"watched", settings.watched}, {"daemon_pid", settings.daemon_pid}};
+}
+
 Json event_json(const Event& event, const WatchState& state) {
   Json json = json_object("event");
   json["time"] = utc_timestamp(event.time);
@@ -64,6 +68,7 @@ Json event_json(const Event& event, const WatchState& state) {
   if (event.failure_data) json["failure_data"] = *event.failure_data;
   if (event.sender) json["sender"] = {{"address", event.sender->address}, {"instance", event.sender->instance}};
   if (event.bits == HB_EVENT_CONFIGURATION) add_configuration(json, state);
+  if (event.heartbeat) json["heartbeat"] = heartbeat_json(*event.heartbeat);
   add_tally(json, event, state);
   return json;
 }

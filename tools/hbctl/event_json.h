@@ -6,6 +6,8 @@
 
 namespace hbctl {
 
+Json heartbeat_json(const HeartbeatSettings& settings);
+
 Json event_json(const Event& event, const WatchState& state);
 
 }  // namespace hbctl

@@ -74,7 +74,7 @@ std::string describe_configuration(const WatchState& state) {
 
 std::string describe(const Event& event, const WatchState& state) {
   if (event.bits == HB_EVENT_CONFIGURATION) return describe_configuration(state);
-  if (event.bits == HB_EVENT_NODE_HEARTBEAT) return "the daemon's settings for client heartbeats";
+  if (event.heartbeat) return describe(*event.heartbeat);
   const std::string members = event.subject == Subject::Nodes      ? number_ranges(widened(event.nodes))
                               : event.subject == Subject::Adapters ? describe_members(event, state)
                                                                    : "";
@@ -118,6 +118,11 @@ std::string columns(const std::string& time, const std::string& sequence, const 
 std::string padded_event(const std::string& word) { return fmt::format("{:<18}", word); }
 
 }  // namespace
+
+std::string describe(const HeartbeatSettings& settings) {
+  return fmt::format("client heartbeats: one every {} s at least, {}, daemon process {}", settings.threshold,
+                     settings.watched ? "watched" : "not watched", settings.daemon_pid);
+}
 
 std::string event_heading(const Style& style) {
   return style.apply(Paint::Heading, columns("TIME", "SEQUENCE", "SUBJECT", padded_event("EVENT")) + "DETAILS") + '\n';

@@ -8,6 +8,8 @@
 
 namespace hbctl {
 
+std::string describe(const HeartbeatSettings& settings);
+
 // The heading over the lines.
 std::string event_heading(const Style& style);
 

@@ -9,35 +9,18 @@
 #include "errors.h"
 #include "hb_client/events.h"
 #include "help_text.h"
+#include "option_parts.h"
+#include "steering_options.h"
 #include "words.h"
 
 namespace hbctl {
 namespace {
 
-constexpr double kLongestSeconds = 1e9;
-
 // What the library's parser hands over before it becomes `Options`.
 struct Raw {
   std::vector<std::string> event_words;
-  uint32_t count = 0;
   double duration = 0;
 };
-
-// A number within limits, the limits included.
-template <class Number>
-CLI::Validator within(Number least, Number most) {
-  const auto check = [least, most](const std::string& text) -> std::string {
-    Number number{};
-    if (CLI::detail::lexical_cast(text, number) && number >= least && number <= most) return "";
-    return fmt::format("'{}' is no number from {} to {}", text, least, most);
-  };
-  return {check, ""};
-}
-
-template <class Number>
-void add_numbers(CLI::App& command, const char* name, std::vector<Number>& numbers, const char* text, int limit) {
-  command.add_option(name, numbers, text)->delimiter(',')->check(within(0, limit - 1))->type_name("N");
-}
 
 void add_networks(CLI::App& command, Options& options) {
   command.add_option("--network", options.selection.networks, "Only these networks, by name or number")
@@ -50,13 +33,6 @@ void add_wait(CLI::App& command, Options& options) {
       ->check(within(0.0, kLongestSeconds))
       ->type_name("SECONDS")
       ->capture_default_str();
-}
-
-CLI::App* add_command(CLI::App& app, Options& options, const char* name, const char* text, const char* examples) {
-  CLI::App* command = app.add_subcommand(name, text);
-  command->add_flag("--json", options.json, "Print JSON, as hbctl-json.md describes it");
-  command->footer(std::string(examples) + help::kCommon);
-  return command;
 }
 
 std::string subscribable_list() {
@@ -83,7 +59,7 @@ void add_watch(CLI::App& app, Options& options, Raw& raw) {
       ->delimiter(',')
       ->check(CLI::Validator(check_event_word, ""))
       ->type_name("EVENT");
-  watch->add_option("--count", raw.count, "End after so many events")
+  watch->add_option("--count", options.count, "End after so many events")
       ->check(within(uint32_t{1}, UINT32_MAX))
       ->type_name("N");
   watch->add_option("--duration", raw.duration, "End after so long")
@@ -93,6 +69,8 @@ void add_watch(CLI::App& app, Options& options, Raw& raw) {
       ->check(CLI::Validator(check_name_prefix, ""))
       ->type_name("PREFIX")
       ->capture_default_str();
+  watch->add_flag("--discard-stale", options.discard_stale,
+                  "Have the daemon drop events that waited too long to be read");
 }
 
 void add_commands(CLI::App& app, Options& options, Raw& raw) {
@@ -107,6 +85,7 @@ void add_commands(CLI::App& app, Options& options, Raw& raw) {
   add_wait(*add_command(app, options, "networks", "List the configured networks", help::kNetworks), options);
   add_command(app, options, "sites", "List the configured sites", help::kSites);
   add_watch(app, options, raw);
+  add_steering_commands(app, options);
 }
 
 void add_common(CLI::App& app, Options& options) {
@@ -127,30 +106,37 @@ void add_common(CLI::App& app, Options& options) {
 void complete(const CLI::App& app, const Raw& raw, Options& options) {
   const CLI::App* command = app.get_subcommands().front();
   options.command = command->get_name();
+  check_steering(options);
   if (options.command != "watch") return;
   for (const std::string& word : raw.event_words) options.events |= bits_of_word(word);
   if (raw.event_words.empty()) {
     options.events =
         HB_EVENT_DEATH | HB_EVENT_JOIN | HB_EVENT_NEW_GROUP | HB_EVENT_DIFF_INSTANCE | HB_EVENT_NODE_HEARTBEAT;
   }
-  if (command->count("--count") != 0) options.count = raw.count;
   if (command->count("--duration") != 0) options.duration = raw.duration;
 }
 
 }  // namespace
 
+CLI::App* add_command(CLI::App& app, Options& options, const char* name, const char* text, const char* examples) {
+  CLI::App* command = app.add_subcommand(name, text);
+  command->add_flag("--json", options.json, "Print JSON, as hbctl-json.md describes it");
+  command->footer(std::string(examples) + help::kCommon);
+  return command;
+}
+
 std::optional<int> parse_options(int argc, const char* const* argv, Options& options) {
-  CLI::App app("Shows the liveness of a cluster as its heartbeat daemon tells it.", "hbctl");
+  CLI::App app("Shows the liveness of a cluster as its heartbeat daemon tells it, and steers the daemon.", "hbctl");
   Raw raw;
   add_common(app, options);
   add_commands(app, options, raw);
   try {
     app.parse(argc, argv);
+    complete(app, raw, options);
   } catch (const CLI::ParseError& error) {
     const int result = app.exit(error, std::cout, std::cerr);
     return result == 0 ? 0 : static_cast<int>(ExitStatus::Usage);
   }
-  complete(app, raw, options);
   return std::nullopt;
 }
 

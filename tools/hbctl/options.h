@@ -12,6 +12,7 @@
 
 namespace hbctl {
 
+// What a person said on the command line. Which members a command looks at is its own matter.
 struct Options {
   std::string command;
   std::string socket;  // empty: the environment's
@@ -23,6 +24,25 @@ struct Options {
   std::string name_prefix = "hbctl";
   std::optional<uint32_t> count;
   std::optional<double> duration;  // seconds
+  bool discard_stale = false;
+
+  // Of the commands that steer.
+  bool yes = false;  // agreed to what is dangerous
+  Hb_Adapter_Number adapter = 0;
+  Hb_Node_Number node = 0;
+  std::string action;  // a word of adapter_action.h or node_action.h
+  std::string value;   // of an adapter's action; fits it
+  bool from_daemon = false;
+  bool ip = false;
+  bool reveal = false;
+  int port = 0;
+  std::string text;  // to send; "-" is standard input
+  uint32_t sequence = 1;
+  std::optional<double> every;  // seconds between heartbeats
+  bool settings = false;
+  int seconds = 0;
+  bool on = false;
+  std::string interface;  // empty: all
 };
 
 // Fills `options`, or returns the exit status when there is nothing left to do: help, the version, or a mistake, each

@@ -26,12 +26,17 @@ class Watch {
     const StopSignals stop;
     SubscriptionPlan first = plan();
     if (!first.unknown.empty()) throw not_configured(first.unknown);
+    if (context_.options.discard_stale) discard_stale();
     follow(first.subscriptions);
     if (!context_.options.json) context_.output.write(event_heading(context_.style));
     take_events({source_.descriptors(), stop.descriptor(), context_.output.descriptor()}, end_of_duration());
   }
 
  private:
+  static void discard_stale() {
+    if (hb_discard_stale_messages(Hb_True) != Hb_Success) throw library_error("cannot have stale events dropped");
+  }
+
   SubscriptionPlan plan() const {
     const Options& options = context_.options;
     return plan_subscriptions(options.selection, options.events, options.name_prefix, state_.cluster());

@@ -39,6 +39,21 @@ constexpr const char* kReasonWords[] = {
     "link-down", "shut-down", "forced-down", "stopped",  "undefined",
 };
 
+// From 1.
+constexpr const char* kMonitoringWords[] = {
+    "unknown",
+    "up",
+    "down",
+    "interface-down",
+    "misconfigured",
+    "broadcast-misconfigured",
+    "not-monitored",
+    "no-monitor",
+    "monitor-error",
+    "cannot-bind-socket",
+    "cannot-open-device",
+};
+
 }  // namespace
 
 std::string state_word(State state) {
@@ -56,6 +71,12 @@ std::string state_word(State state) {
 std::string reason_word(Hb_Entity_State_Reason reason) {
   if (reason < 0 || reason >= static_cast<int>(std::size(kReasonWords))) return fmt::format("reason {}", int{reason});
   return kReasonWords[reason];
+}
+
+std::string monitoring_word(Hb_Adapter_state_t state) {
+  const int number = state;
+  if (number < 1 || number > static_cast<int>(std::size(kMonitoringWords))) return fmt::format("state {}", number);
+  return kMonitoringWords[number - 1];
 }
 
 std::string event_word(Hb_Events bits) {

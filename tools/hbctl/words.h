@@ -4,6 +4,7 @@
 #include <string>
 #include <vector>
 
+#include "hb_client/control.h"
 #include "hb_client/group.h"
 #include "liveness.h"
 
@@ -11,6 +12,9 @@ namespace hbctl {
 
 std::string state_word(State state);
 std::string reason_word(Hb_Entity_State_Reason reason);
+
+// What the daemon's monitoring says of an adapter: "up", "not-monitored", ...
+std::string monitoring_word(Hb_Adapter_state_t state);
 
 // "death", "new-group", ...; "event" for bits that have no word.
 std::string event_word(Hb_Events bits);
