@@ -2,23 +2,18 @@
 // route that was half written.
 #include <gtest/gtest.h>
 #include <sched.h>
-#include <sys/mman.h>
-#include <sys/prctl.h>
 #include <sys/sem.h>
 #include <sys/shm.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <atomic>
 #include <cerrno>
-#include <csignal>
-#include <cstring>
-#include <functional>
-#include <new>
 #include <random>
 
+#include "child_process.h"
 #include "hb_client/route.h"
 #include "queries/test_cluster.h"
+#include "sealed_route.h"
 #include "support/running_client.h"
 
 namespace hb_test {
@@ -38,41 +33,6 @@ struct Progress {
   std::atomic<uint64_t> written = 0;
   std::atomic<bool> ends = false;
 };
-
-// In memory that child processes share.
-class Shared_Progress {
- public:
-  Shared_Progress() {
-    void* memory = mmap(nullptr, sizeof(Progress), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
-    if (memory == MAP_FAILED) throw std::bad_alloc();
-    progress_ = new (memory) Progress;
-  }
-  ~Shared_Progress() { munmap(progress_, sizeof(Progress)); }
-  Shared_Progress(const Shared_Progress&) = delete;
-  Shared_Progress& operator=(const Shared_Progress&) = delete;
-
-  Progress* operator->() const { return progress_; }
-  Progress& operator*() const { return *progress_; }
-
- private:
-  Progress* progress_;
-};
-
-// The last hop of a route is made of all the others, so that bytes of two routes do not fit together.
-void seal(uint32_t (&words)[44]) {
-  uint32_t sum = 0x811C9DC5;
-  for (size_t i = 0; i < 40; ++i) sum = (sum ^ words[i]) * 0x01000193;
-  for (size_t i = 40; i < 44; ++i) words[i] = sum + static_cast<uint32_t>(i);
-}
-
-bool is_sealed(const Hb_Source_Route& route) {
-  uint32_t words[44];
-  std::memcpy(words, &route, sizeof words);
-  uint32_t sealed[44];
-  std::memcpy(sealed, words, sizeof sealed);
-  seal(sealed);
-  return std::memcmp(words, sealed, sizeof words) == 0;
-}
 
 // The daemon's side of the lock and of the two segments, by the numbers.
 class Writer {
@@ -124,44 +84,6 @@ class Writer {
   uint32_t seed_ = static_cast<uint32_t>(getpid());
 };
 
-// A process that a test kills, or that ends by itself.
-class Child {
- public:
-  explicit Child(const std::function<void()>& work) : pid_(fork()) {
-    if (pid_ == 0) {
-      prctl(PR_SET_PDEATHSIG, SIGKILL);
-      work();
-      _exit(0);
-    }
-  }
-  ~Child() {
-    if (pid_ > 0) kill_and_wait();
-  }
-  Child(const Child&) = delete;
-  Child& operator=(const Child&) = delete;
-
-  void kill_and_wait() {
-    ::kill(pid_, SIGKILL);
-    wait();
-  }
-  // The exit status, or -1 when a signal ended it.
-  int wait() {
-    int status = 0;
-    waitpid(pid_, &status, 0);
-    pid_ = -1;
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-  }
-  void stop() const {
-    ::kill(pid_, SIGSTOP);
-    int status = 0;
-    waitpid(pid_, &status, WUNTRACED);
-  }
-  void go_on() const { ::kill(pid_, SIGCONT); }
-
- private:
-  pid_t pid_;
-};
-
 class KilledProcesses : public RunningClient {
  protected:
   KilledProcesses() : RunningClient(Publication::for_nodes(nodes), sparse_cluster()) {}
@@ -192,23 +114,15 @@ class KilledProcesses : public RunningClient {
     }
   }
 
-  // Lets other processes run until the count is above the value.
-  static void await_above(const std::atomic<uint64_t>& count, uint64_t value) {
-    while (count <= value) sched_yield();
-  }
-
   // Up to some tens of microseconds, in which a child gets to any place of its loop.
-  void pass_a_moment() {
-    const uint64_t turns = random_() % 20000;
-    for (uint64_t turn = 0; turn < turns; ++turn) std::atomic_signal_fence(std::memory_order_seq_cst);
-  }
+  void pass_a_moment() { pass(random_() % 20000); }
 
   void expect_free_lock() {
     EXPECT_EQ(0, semaphore(readers_semaphore));
     EXPECT_EQ(0, semaphore(writer_semaphore));
   }
 
-  Shared_Progress progress;
+  Shared<Progress> progress;
 
  private:
   std::minstd_rand random_{4711};
