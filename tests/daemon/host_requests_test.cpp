@@ -21,6 +21,8 @@ constexpr std::uint32_t configure = 214;
 constexpr std::uint32_t unconfigure = 215;
 constexpr std::uint32_t swap_addresses = 218;
 constexpr std::uint32_t get_state = 223;
+constexpr std::uint32_t start_manual_control = 225;
+constexpr std::uint32_t end_manual_control = 226;
 
 constexpr std::uint32_t configured = 10;
 constexpr std::uint32_t free_address = address4(192, 0, 2, 9);
@@ -58,6 +60,12 @@ class HostRequest : public testing::Test {
       update = wait_for_configuration(*client_);
     }
     return update;
+  }
+
+  /* Has the client told of the adapter's deaths and joins. An adapter with an IPv6 address goes with its address. */
+  void follow_adapter() {
+    ASSERT_LT(number_, 8U);
+    client_->subscribe(SubscriptionType::Adapter, 3, "s", {static_cast<std::uint8_t>(0x80U >> number_)});
   }
 
   /* Has the client told of updates from here on. */
@@ -110,7 +118,7 @@ TEST_F(HostRequest, switches_the_interface_off_and_on_and_its_address_stays) {
   }
   start();
   EXPECT_EQ(state(), 2U);
-  client_->subscribe(SubscriptionType::AllAdapters, 3, "s");
+  follow_adapter();
   client_->send(steer(interface_down, 0));
   EXPECT_EQ(wait_for(*client_, 2, number_), 1U);
   EXPECT_EQ(state(), 4U);
@@ -120,6 +128,22 @@ TEST_F(HostRequest, switches_the_interface_off_and_on_and_its_address_stays) {
   client_->send(steer(interface_up, 0));
   EXPECT_EQ(wait_for(*client_, 3, number_), 2U);
   EXPECT_EQ(state(), 2U);
+}
+
+TEST_F(HostRequest, to_switch_an_interface_is_told_when_manual_control_ends) {
+  if (!is_allowed_) {
+    expect_refusal();
+    return;
+  }
+  start();
+  follow_adapter();
+  client_->send(request(start_manual_control, {'l', 'o'}));
+  client_->send(steer(interface_down, 0));
+  while (state() != 4U) { /* until the kernel has told so */
+  }
+  EXPECT_EQ(found(ipv4(127, 0, 0, 1))->state, up);
+  client_->send(request(end_manual_control, {'l', 'o'}));
+  EXPECT_EQ(wait_for(*client_, 2, number_), 1U);
 }
 
 TEST_F(HostRequest, takes_another_address_and_removes_it) {
