@@ -57,8 +57,10 @@ std::vector<std::string> offered_by(PlayedDaemon& daemon, std::vector<std::strin
 }
 
 TEST(HbctlCompletion, offers_the_commands) {
-  EXPECT_THAT(offered({""}), UnorderedElementsAre("status", "nodes", "adapters", "networks", "sites", "watch"));
-  EXPECT_THAT(offered({"n"}), UnorderedElementsAre("nodes", "networks"));
+  EXPECT_THAT(offered({""}),
+              UnorderedElementsAre("status", "nodes", "adapters", "networks", "sites", "watch", "adapter", "node",
+                                   "route", "security", "send", "heartbeat", "simulate-death", "stale", "monitors"));
+  EXPECT_THAT(offered({"n"}), UnorderedElementsAre("nodes", "networks", "node"));
 }
 
 TEST(HbctlCompletion, offers_a_command_after_an_option_with_its_value) {
@@ -69,13 +71,14 @@ TEST(HbctlCompletion, offers_a_command_after_an_option_with_its_value) {
 TEST(HbctlCompletion, offers_the_options_of_the_command) {
   EXPECT_THAT(offered({"watch", "--"}),
               UnorderedElementsAre("--help", "--socket", "--color", "--json", "--node", "--adapter", "--network",
-                                   "--events", "--count", "--duration", "--name"));
+                                   "--events", "--count", "--duration", "--name", "--discard-stale"));
   EXPECT_THAT(offered({"sites", "--"}), UnorderedElementsAre("--help", "--socket", "--color", "--json"));
   EXPECT_THAT(offered({"--v"}), ElementsAre("--version"));
 }
 
 TEST(HbctlCompletion, offers_only_options_that_the_command_has) {
-  for (const char* command : {"status", "nodes", "adapters", "networks", "sites", "watch"}) {
+  for (const char* command : {"status", "nodes", "adapters", "networks", "sites", "watch", "adapter", "node", "route",
+                              "security", "send", "heartbeat", "simulate-death", "stale", "monitors"}) {
     const std::string help = ChildProcess(hbctl({command, "--help"})).finish().output;
     const std::string common = ChildProcess(hbctl({"--help"})).finish().output;
     for (const std::string& option : offered({command, "--"}))
@@ -120,6 +123,39 @@ TEST(HbctlCompletion, asks_the_daemon_whose_socket_is_on_the_command_line) {
               ElementsAre("0", "1", "2"));
   EXPECT_THAT(offered_by(daemon, {"--socket", "=", daemon.daemon().path(), "watch", "--node", ""}),
               ElementsAre("0", "1", "2"));
+}
+
+TEST(HbctlCompletion, offers_what_stands_at_each_place_of_an_adapter) {
+  PlayedDaemon daemon;
+  EXPECT_THAT(offered_by(daemon, {"adapter", ""}), ElementsAre("0", "1", "2", "3", "4", "5"));
+  EXPECT_THAT(offered({"adapter", "0", ""}),
+              ElementsAre("enable", "disable", "ifdown", "ifup", "configure", "unconfigure", "swap", "grace", "state",
+                          "may-be-down", "is-down"));
+  EXPECT_THAT(offered({"adapter", "--yes", "0", "if"}), ElementsAre("ifdown", "ifup"));
+  EXPECT_THAT(offered({"--socket", daemon.daemon().path(), "adapter", "--color", "=", "never", "0", "st"}),
+              ElementsAre("state"));
+  EXPECT_THAT(offered_by(daemon, {"adapter", "0", "swap", "10.0.0.2"}), ElementsAre("10.0.0.2"));
+  EXPECT_THAT(offered({"adapter", "0", "grace", ""}), IsEmpty());
+  EXPECT_THAT(offered({"adapter", "0", "--"}),
+              UnorderedElementsAre("--help", "--socket", "--color", "--json", "--yes"));
+}
+
+TEST(HbctlCompletion, offers_every_action_that_the_command_takes) {
+  const std::string help = ChildProcess(hbctl({"adapter", "--help"})).finish().output;
+  std::string actions;
+  for (const std::string& action : offered({"adapter", "0", ""})) actions += (actions.empty() ? "" : ", ") + action;
+  EXPECT_THAT(help, testing::HasSubstr("What to do: " + actions + "\n"));
+}
+
+TEST(HbctlCompletion, offers_what_stands_at_each_place_of_the_other_commands_that_steer) {
+  PlayedDaemon daemon;
+  EXPECT_THAT(offered_by(daemon, {"node", ""}), ElementsAre("0", "1", "2"));
+  EXPECT_THAT(offered({"node", "1", ""}), ElementsAre("may-be-down", "is-down"));
+  EXPECT_THAT(offered_by(daemon, {"route", ""}), ElementsAre("0", "1", "2"));
+  EXPECT_THAT(offered_by(daemon, {"send", "--node", ""}), ElementsAre("0", "1", "2"));
+  EXPECT_THAT(offered({"stale", ""}), ElementsAre("on", "off"));
+  EXPECT_THAT(offered({"monitors", "o"}), ElementsAre("on", "off"));
+  EXPECT_THAT(offered_by(daemon, {"monitors", "on", ""}), ElementsAre("ether"));
 }
 
 TEST(HbctlCompletion, offers_nothing_and_says_nothing_without_a_daemon) {

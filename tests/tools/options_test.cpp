@@ -94,6 +94,112 @@ TEST(HbctlOptions, refuse_what_cannot_be_meant) {
   for (const auto& mistake : mistakes) EXPECT_EQ(parse(mistake).status, 2) << testing::PrintToString(mistake);
 }
 
+TEST(HbctlOptions, of_an_adapter_are_its_number_the_action_and_its_value) {
+  const Options options = parse({"adapter", "98351", "configure", "10.0.0.9", "--yes"}).options;
+  EXPECT_EQ(options.command, "adapter");
+  EXPECT_EQ(options.adapter, 98351U);
+  EXPECT_EQ(options.action, "configure");
+  EXPECT_EQ(options.value, "10.0.0.9");
+  EXPECT_TRUE(options.yes);
+  EXPECT_FALSE(parse({"adapter", "0", "enable"}).options.yes);
+}
+
+TEST(HbctlOptions, of_an_adapter_know_every_action) {
+  for (const char* action : {"enable", "disable", "ifdown", "ifup", "unconfigure", "state", "may-be-down", "is-down"})
+    EXPECT_EQ(parse({"adapter", "1", action}).options.action, action);
+  EXPECT_EQ(parse({"adapter", "1", "swap", "255.255.255.255"}).status, std::nullopt);
+  EXPECT_EQ(parse({"adapter", "1", "grace", "0"}).status, std::nullopt);
+  EXPECT_EQ(parse({"adapter", "1", "grace", "2147483647"}).status, std::nullopt);
+}
+
+TEST(HbctlOptions, of_a_node_and_of_a_route) {
+  const Options node = parse({"node", "2048", "is-down"}).options;
+  EXPECT_EQ(node.node, 2048);
+  EXPECT_EQ(node.action, "is-down");
+  EXPECT_TRUE(parse({"route", "1", "--from-daemon"}).options.from_daemon);
+  EXPECT_TRUE(parse({"route", "1", "--ip"}).options.ip);
+  EXPECT_FALSE(parse({"route", "1"}).options.ip);
+}
+
+TEST(HbctlOptions, of_a_message) {
+  const Options options = parse({"send", "--node", "1,2", "--node", "5", "--port", "65535", "--", "-hello"}).options;
+  EXPECT_THAT(options.selection.nodes, ElementsAre(1, 2, 5));
+  EXPECT_EQ(options.port, 65535);
+  EXPECT_EQ(options.text, "-hello");
+  EXPECT_EQ(parse({"send", "--node", "1", "--port", "7", "-"}).options.text, "-");
+}
+
+TEST(HbctlOptions, of_heartbeats) {
+  const Options options = parse({"heartbeat", "--every", "0.5", "--count", "3", "--sequence", "0"}).options;
+  EXPECT_EQ(options.every, 0.5);
+  EXPECT_EQ(options.count, 3U);
+  EXPECT_EQ(options.sequence, 0U);
+  EXPECT_FALSE(options.settings);
+  EXPECT_EQ(parse({"heartbeat"}).options.sequence, 1U);
+  EXPECT_EQ(parse({"heartbeat"}).options.every, std::nullopt);
+  EXPECT_EQ(parse({"heartbeat", "--settings", "--wait", "2"}).options.wait, 2.0);
+}
+
+TEST(HbctlOptions, that_switch) {
+  EXPECT_TRUE(parse({"stale", "on"}).options.on);
+  EXPECT_FALSE(parse({"stale", "off"}).options.on);
+  const Options monitors = parse({"monitors", "on", "en0"}).options;
+  EXPECT_TRUE(monitors.on);
+  EXPECT_EQ(monitors.interface, "en0");
+  EXPECT_EQ(parse({"monitors", "off"}).options.interface, "");
+  EXPECT_TRUE(parse({"watch", "--discard-stale"}).options.discard_stale);
+  EXPECT_FALSE(parse({"watch"}).options.discard_stale);
+  EXPECT_EQ(parse({"simulate-death", "5"}).options.seconds, 5);
+  EXPECT_TRUE(parse({"security", "--reveal"}).options.reveal);
+  EXPECT_FALSE(parse({"security"}).options.reveal);
+}
+
+TEST(HbctlOptions, that_steer_refuse_what_cannot_be_meant) {
+  const std::vector<std::vector<const char*>> mistakes = {
+      {"adapter"},
+      {"adapter", "1"},
+      {"adapter", "1", "break"},
+      {"adapter", "98352", "enable"},
+      {"adapter", "-1", "enable"},
+      {"adapter", "one", "enable"},
+      {"adapter", "1", "enable", "5"},
+      {"adapter", "1", "configure"},
+      {"adapter", "1", "configure", "10.0.0"},
+      {"adapter", "1", "configure", "2001:db8::1"},
+      {"adapter", "1", "swap"},
+      {"adapter", "1", "grace"},
+      {"adapter", "1", "grace", "-1"},
+      {"adapter", "1", "grace", "1.5"},
+      {"adapter", "1", "grace", "2147483648"},
+      {"adapter", "1", "grace", "5", "6"},
+      {"node", "1"},
+      {"node", "2049", "is-down"},
+      {"node", "1", "enable"},
+      {"route"},
+      {"route", "-1"},
+      {"route", "2049"},
+      {"route", "1", "--ip", "--from-daemon"},
+      {"security", "1"},
+      {"send", "x", "--port", "7"},
+      {"send", "x", "--node", "1"},
+      {"send", "x", "--node", "1", "--port", "65536"},
+      {"send", "--node", "1", "x", "--port", "7"},
+      {"heartbeat", "--count", "3"},
+      {"heartbeat", "--every", "0"},
+      {"heartbeat", "--every", "1", "--count", "0"},
+      {"heartbeat", "--sequence", "4294967296"},
+      {"heartbeat", "--wait", "1"},
+      {"simulate-death"},
+      {"simulate-death", "-1"},
+      {"stale"},
+      {"stale", "maybe"},
+      {"monitors", "en0"},
+      {"stale", "on", "en0"},
+      {"watch", "--yes"},
+  };
+  for (const auto& mistake : mistakes) EXPECT_EQ(parse(mistake).status, 2) << testing::PrintToString(mistake);
+}
+
 TEST(HbctlOptions, for_help_and_version_leave_nothing_to_do) {
   EXPECT_EQ(parse({"--help"}).status, 0);
   EXPECT_EQ(parse({"watch", "--help"}).status, 0);

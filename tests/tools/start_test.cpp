@@ -44,11 +44,31 @@ TEST_F(HbctlStart, without_a_daemon_names_the_socket_the_error_and_how_to_start_
 }
 
 TEST_F(HbctlStart, without_a_daemon_fails_alike_in_every_command) {
-  for (const char* command : {"status", "nodes", "adapters", "networks", "sites", "watch"}) {
-    const Finished finished = run({"--socket", absent(), command});
+  const std::vector<std::vector<std::string>> commands = {
+      {"status"},
+      {"nodes"},
+      {"adapters"},
+      {"networks"},
+      {"sites"},
+      {"watch"},
+      {"adapter", "1", "ifdown", "--yes"},
+      {"adapter", "1", "state"},
+      {"node", "1", "may-be-down"},
+      {"route", "1"},
+      {"route", "1", "--from-daemon"},
+      {"security"},
+      {"send", "--node", "1", "--port", "7"},
+      {"heartbeat"},
+      {"simulate-death", "1", "--yes"},
+      {"stale", "on"},
+      {"monitors", "on"},
+  };
+  for (std::vector<std::string> command : commands) {
+    command.insert(command.begin(), {"--socket", absent()});
+    const Finished finished = run(command);
     EXPECT_THAT(finished.errors, StartsWith("hbctl: no daemon answers on " + absent() + ": HB_ECONNECT (15)"))
-        << command;
-    EXPECT_EQ(finished.status, 3) << command;
+        << testing::PrintToString(command);
+    EXPECT_EQ(finished.status, 3) << testing::PrintToString(command);
   }
 }
 
@@ -161,7 +181,9 @@ TEST_F(HbctlStart, with_a_wrong_command_line_is_a_usage_error) {
                                                                {"nodes", "extra"},
                                                                {"nodes", "--wait", "soon"},
                                                                {"watch", "--node", "2049"},
-                                                               {"--color", "red"}};
+                                                               {"--color", "red"},
+                                                               {"adapter", "1"},
+                                                               {"adapter", "1", "configure"}};
   for (const auto& command_line : command_lines) {
     const Finished finished = run(command_line);
     EXPECT_THAT(finished.errors, StartsWith("hbctl: ")) << testing::PrintToString(command_line);
@@ -170,7 +192,8 @@ TEST_F(HbctlStart, with_a_wrong_command_line_is_a_usage_error) {
 }
 
 TEST_F(HbctlStart, helps_on_every_level_with_examples) {
-  for (const char* command : {"status", "nodes", "adapters", "networks", "sites", "watch"}) {
+  for (const char* command : {"status", "nodes", "adapters", "networks", "sites", "watch", "adapter", "node", "route",
+                              "security", "send", "heartbeat", "simulate-death", "stale", "monitors"}) {
     const Finished finished = run({command, "--help"});
     EXPECT_THAT(finished.output, HasSubstr(std::string("Examples:\n  hbctl ") + command)) << command;
     EXPECT_THAT(finished.output, HasSubstr("--json")) << command;

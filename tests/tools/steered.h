@@ -20,10 +20,9 @@ inline Bytes octets(const std::vector<uint8_t>& values) { return {values.begin()
 class Steered : public testing::Test {
  protected:
   // Runs the command up to its request, which is awaited in full; there is no other before it.
-  Bytes begin(const std::vector<std::string>& arguments, int32_t kind,
-              const ConfigurationMessage& configuration = small_cluster()) {
-    child_ = std::make_unique<ChildProcess>(hbctl(arguments));
-    daemon_.start(configuration);
+  Bytes begin(const std::vector<std::string>& arguments, int32_t kind, const Streams& streams = {}) {
+    child_ = std::make_unique<ChildProcess>(hbctl(arguments), streams);
+    daemon_.start();
     return daemon_.expect(kind);
   }
 

@@ -5,6 +5,25 @@
 namespace hbctl {
 namespace {
 
+TEST(HbctlWords, name_what_monitoring_says) {
+  const char* words[] = {"unknown",
+                         "up",
+                         "down",
+                         "interface-down",
+                         "misconfigured",
+                         "broadcast-misconfigured",
+                         "not-monitored",
+                         "no-monitor",
+                         "monitor-error",
+                         "cannot-bind-socket",
+                         "cannot-open-device"};
+  for (int number = 1; number <= 11; ++number)
+    EXPECT_EQ(monitoring_word(static_cast<Hb_Adapter_state_t>(number)), words[number - 1]);
+  EXPECT_EQ(monitoring_word(static_cast<Hb_Adapter_state_t>(0)), "state 0");
+  EXPECT_EQ(monitoring_word(static_cast<Hb_Adapter_state_t>(12)), "state 12");
+  EXPECT_EQ(monitoring_word(static_cast<Hb_Adapter_state_t>(-1)), "state -1");
+}
+
 TEST(HbctlWords, name_each_event) {
   EXPECT_EQ(event_word(0), "empty");
   EXPECT_EQ(event_word(1), "death");

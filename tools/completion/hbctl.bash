@@ -20,16 +20,41 @@ _hbctl_values() {
 
 _hbctl_nodes() { _hbctl_ask nodes --wait 0 | _hbctl_values number; }
 _hbctl_adapters() { _hbctl_ask adapters --wait 0 | _hbctl_values number; }
+_hbctl_addresses() { _hbctl_ask adapters --wait 0 | _hbctl_values address; }
+_hbctl_interfaces() { _hbctl_ask adapters --wait 0 | _hbctl_values adapter_type | sort -u; }
 _hbctl_networks() { _hbctl_ask networks --wait 0 | _hbctl_values name; }
+
+_hbctl_commands='status nodes adapters networks sites watch adapter node route security send heartbeat simulate-death
+stale monitors'
 
 # The subcommand on the command line, if there is one.
 _hbctl_subcommand() {
   local i
   for ((i = 1; i < COMP_CWORD; i++)); do
+    if [[ " ${_hbctl_commands//$'\n'/ } " == *" ${COMP_WORDS[i]} "* ]]; then
+      printf '%s' "${COMP_WORDS[i]}"
+      return
+    fi
+  done
+}
+
+# What stands between the subcommand $1 and the word that is being typed, without options and the values of --socket
+# and --color.
+_hbctl_arguments() {
+  local i seen=
+  for ((i = 1; i < COMP_CWORD; i++)); do
     case ${COMP_WORDS[i]} in
-      status | nodes | adapters | networks | sites | watch)
-        printf '%s' "${COMP_WORDS[i]}"
-        return
+      --socket | --color)
+        [[ ${COMP_WORDS[i + 1]} == '=' ]] && ((i++))
+        ((i++))
+        ;;
+      -*) ;;
+      *)
+        if [[ -n $seen ]]; then
+          printf '%s\n' "${COMP_WORDS[i]}"
+        elif [[ ${COMP_WORDS[i]} == "$1" ]]; then
+          seen=1
+        fi
         ;;
     esac
   done
@@ -53,7 +78,15 @@ _hbctl_options_of() {
     status | nodes | networks) printf '%s' "$common --json --wait" ;;
     adapters) printf '%s' "$common --json --wait --node --network" ;;
     sites) printf '%s' "$common --json" ;;
-    watch) printf '%s' "$common --json --node --adapter --network --events --count --duration --name" ;;
+    watch)
+      printf '%s' "$common --json --node --adapter --network --events --count --duration --name --discard-stale"
+      ;;
+    adapter | node | simulate-death) printf '%s' "$common --json --yes" ;;
+    route) printf '%s' "$common --json --from-daemon --ip" ;;
+    security) printf '%s' "$common --json --reveal" ;;
+    send) printf '%s' "$common --json --node --port" ;;
+    heartbeat) printf '%s' "$common --json --sequence --every --count --settings --wait" ;;
+    stale | monitors) printf '%s' "$common --json" ;;
   esac
 }
 
@@ -91,8 +124,25 @@ _hbctl_offer_values() {
       ;;
     --color) _hbctl_is_first_value && _hbctl_offer_words 'auto always never' "$2" ;;
     --socket) _hbctl_is_first_value && _hbctl_offer_files "$2" ;;
-    --wait | --count | --duration | --name) _hbctl_is_first_value ;;
+    --wait | --count | --duration | --name | --port | --sequence | --every) _hbctl_is_first_value ;;
     *) return 1 ;;
+  esac
+}
+
+# Offers the values that subcommand $1 takes by their place and that begin with $2.
+_hbctl_offer_arguments() {
+  local -a before
+  mapfile -t before < <(_hbctl_arguments "$1")
+  case $1:${#before[@]} in
+    adapter:0) _hbctl_offer "$(_hbctl_adapters)" "$2" ;;
+    adapter:1)
+      _hbctl_offer_words 'enable disable ifdown ifup configure unconfigure swap grace state may-be-down is-down' "$2"
+      ;;
+    adapter:2) [[ ${before[1]} == swap ]] && _hbctl_offer "$(_hbctl_addresses)" "$2" ;;
+    node:0 | route:0) _hbctl_offer "$(_hbctl_nodes)" "$2" ;;
+    node:1) _hbctl_offer_words 'may-be-down is-down' "$2" ;;
+    stale:0 | monitors:0) _hbctl_offer_words 'on off' "$2" ;;
+    monitors:1) _hbctl_offer "$(_hbctl_interfaces)" "$2" ;;
   esac
 }
 
@@ -104,8 +154,12 @@ _hbctl() {
   COMPREPLY=()
   if [[ $current == -* ]]; then
     _hbctl_offer_words "$(_hbctl_options_of "$subcommand")" "$current"
-  elif ! _hbctl_offer_values "$(_hbctl_option)" "$current" && [[ -z $subcommand ]]; then
-    _hbctl_offer_words 'status nodes adapters networks sites watch' "$current"
+  elif _hbctl_offer_values "$(_hbctl_option)" "$current"; then
+    return
+  elif [[ -z $subcommand ]]; then
+    _hbctl_offer_words "${_hbctl_commands//$'\n'/ }" "$current"
+  else
+    _hbctl_offer_arguments "$subcommand" "$current"
   fi
 }
 

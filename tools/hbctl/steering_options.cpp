@@ -32,34 +32,33 @@ void add_yes(CLI::App& command, Options& options) {
 }
 
 void add_node_number(CLI::App& command, Options& options) {
-  command.add_option("number", options.node, "Number of the node")
+  command.add_option("NUMBER", options.node, "Number of the node")
       ->required()
       ->check(within(0, HB_MAX_NODES - 1))
-      ->type_name("NUMBER");
+      ->type_name("");
 }
 
 void add_adapter(CLI::App& app, Options& options) {
   CLI::App* adapter = add_command(app, options, "adapter", "Steer an adapter, or report about it", help::kAdapter);
-  adapter->add_option("number", options.adapter, "Number of the adapter")
+  adapter->add_option("NUMBER", options.adapter, "Number of the adapter")
       ->required()
       ->check(within(0, HB_MAX_ADAPTERS - 1))
-      ->type_name("NUMBER");
-  adapter->add_option("action", options.action, "What to do: " + words_of(adapter_actions()))
+      ->type_name("");
+  adapter->add_option("ACTION", options.action, "What to do: " + words_of(adapter_actions()))
       ->required()
       ->check(word_of(adapter_actions()))
-      ->type_name("ACTION");
-  adapter->add_option("value", options.value, "ADDRESS to configure or to swap with, SECONDS of grace")
-      ->type_name("VALUE");
+      ->type_name("");
+  adapter->add_option("VALUE", options.value, "ADDRESS to configure or to swap with, SECONDS of grace")->type_name("");
   add_yes(*adapter, options);
 }
 
 void add_node(CLI::App& app, Options& options) {
   CLI::App* node = add_command(app, options, "node", "Report about a node", help::kNode);
   add_node_number(*node, options);
-  node->add_option("action", options.action, "What to do: " + words_of(node_actions()))
+  node->add_option("ACTION", options.action, "What to do: " + words_of(node_actions()))
       ->required()
       ->check(word_of(node_actions()))
-      ->type_name("ACTION");
+      ->type_name("");
   add_yes(*node, options);
 }
 
@@ -84,8 +83,8 @@ void add_send(CLI::App& app, Options& options) {
       ->required()
       ->check(within(0, UINT16_MAX))
       ->type_name("PORT");
-  send->add_option("text", options.text, "The message; - reads it from standard input, and nothing is one of no bytes")
-      ->type_name("TEXT");
+  send->add_option("TEXT", options.text, "The message; - reads it from standard input, and nothing is one of no bytes")
+      ->type_name("");
 }
 
 void add_heartbeat(CLI::App& app, Options& options) {
@@ -113,10 +112,10 @@ void add_heartbeat(CLI::App& app, Options& options) {
 void add_simulate_death(CLI::App& app, Options& options) {
   CLI::App* death =
       add_command(app, options, "simulate-death", "Have this node play dead for some time", help::kSimulateDeath);
-  death->add_option("seconds", options.seconds, "For how long; 0 is the time of the configuration")
+  death->add_option("SECONDS", options.seconds, "For how long; 0 is the time of the configuration")
       ->required()
       ->check(within(0, INT_MAX))
-      ->type_name("SECONDS");
+      ->type_name("");
   add_yes(*death, options);
 }
 
@@ -124,10 +123,10 @@ CLI::App* add_switch(CLI::App& app, Options& options, const char* name, const ch
   CLI::App* command = add_command(app, options, name, text, examples);
   command
       ->add_option_function<std::string>(
-          "switch", [&options](const std::string& word) { options.on = word == "on"; }, "on or off")
+          "SWITCH", [&options](const std::string& word) { options.on = word == "on"; }, "on or off")
       ->required()
       ->check(CLI::IsMember({"on", "off"}))
-      ->type_name("on|off");
+      ->type_name("");
   return command;
 }
 
@@ -143,14 +142,14 @@ void add_steering_commands(CLI::App& app, Options& options) {
   add_simulate_death(app, options);
   add_switch(app, options, "stale", "Have stale events of this very connection dropped, or not", help::kStale);
   add_switch(app, options, "monitors", "Put interface monitors under manual control, or not", help::kMonitors)
-      ->add_option("name", options.interface, "Name of the interface; all of them when it is left out")
-      ->type_name("NAME");
+      ->add_option("NAME", options.interface, "Name of the interface; all of them when it is left out")
+      ->type_name("");
 }
 
 void check_steering(const Options& options) {
   if (options.command != "adapter") return;
   const std::string mistake = check_action_value(*find_adapter_action(options.action), options.value);
-  if (!mistake.empty()) throw CLI::ValidationError("value", mistake);
+  if (!mistake.empty()) throw CLI::ValidationError("VALUE", mistake);
 }
 
 }  // namespace hbctl
