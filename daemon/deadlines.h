@@ -2,10 +2,10 @@
 #ifndef HBD_DEADLINES_H
 #define HBD_DEADLINES_H
 
-#include <compare>
 #include <cstdint>
 #include <map>
 #include <set>
+#include <tuple>
 #include <utility>
 
 #include "change.h"
@@ -20,7 +20,9 @@ struct DeadlineKey {
   Purpose purpose = Purpose::Grace;
   std::uint32_t number = 0; /**< of the adapter or node */
 
-  auto operator<=>(const DeadlineKey&) const = default;
+  bool operator<(const DeadlineKey& other) const {
+    return std::tie(purpose, number) < std::tie(other.purpose, other.number);
+  }
 };
 
 /** Makes changes when their time has come. */
@@ -30,7 +32,6 @@ class Deadlines {
 
   void set(DeadlineKey key, std::chrono::milliseconds delay, Change change);
   void cancel(DeadlineKey key);
-  [[nodiscard]] bool is_set(DeadlineKey key) const { return entries_.contains(key); }
 
  private:
   struct Entry {

@@ -328,7 +328,10 @@ INSTANTIATE_TEST_SUITE_P(
                     Usage{"host_with_speed", {"--host", "--speed", "2"}},
                     Usage{"speed_with_as_fast", {"--speed", "2", "--as-fast-as-read"}},
                     Usage{"speed_0", {"--speed", "0"}}, Usage{"bad_log_level", {"--log-level", "loud"}},
-                    Usage{"queue_of_no_bytes", {"--client-queue-bytes", "0"}}),
+                    Usage{"queue_of_no_bytes", {"--client-queue-bytes", "0"}},
+                    Usage{"stale_age_without_unit", {"--stale-age", "10"}},
+                    Usage{"negative_patience", {"--reader-patience", "-1s"}},
+                    Usage{"key_rotation_that_is_no_time", {"--key-rotation", "often"}}),
     [](const auto& each) { return each.param.name; });
 
 TEST(Help, and_version_go_to_standard_output_and_end_with_0) {
