@@ -48,6 +48,8 @@ int main(int argc, char** argv) {
   bench::add_look_up_rows();
   bench::add_walk_rows();
   bench::add_request_rows();
+  bench::add_steering_rows();
+  bench::add_route_rows();
   bench::add_notification_rows();
   bench::add_memory_rows();
 #ifdef HB_BENCH_DAEMON

@@ -20,44 +20,40 @@ void hand_over(benchmark::State& state, const Row& row, const Comparison& result
   state.counters["stable"] = result.stable ? 1 : 0;
 }
 
-void run_row(benchmark::State& state, const Row& row, const Body& body) {
-  for (auto iteration : state) {
-    (void)iteration;
-    try {
-      body([&](const Contender& ours, const Contender& floor) {
-        hand_over(state, row, measure(ours, floor, row.limits));
-      });
-    } catch (const std::exception& error) {
-      state.SkipWithError(error.what());
+// Runs the row once; what it throws becomes its error.
+void register_row(const std::string& name, const std::function<void(benchmark::State&)>& run) {
+  const auto once = [run](benchmark::State& state) {
+    for (auto iteration : state) {
+      (void)iteration;
+      try {
+        run(state);
+      } catch (const std::exception& error) {
+        state.SkipWithError(error.what());
+      }
     }
-  }
-}
-
-void run_memory_row(benchmark::State& state, const std::function<double()>& bytes) {
-  for (auto iteration : state) {
-    (void)iteration;
-    try {
-      state.counters["bytes"] = bytes();
-      state.SetIterationTime(1e-9);
-    } catch (const std::exception& error) {
-      state.SkipWithError(error.what());
-    }
-  }
+  };
+  benchmark::RegisterBenchmark(name.c_str(), once)->UseManualTime()->Unit(benchmark::kMicrosecond)->Iterations(1);
 }
 
 }  // namespace
 
 void add_row(const Row& row, const Body& body) {
-  benchmark::RegisterBenchmark(row.name.c_str(), [row, body](benchmark::State& state) { run_row(state, row, body); })
-      ->UseManualTime()
-      ->Unit(benchmark::kMicrosecond)
-      ->Iterations(1);
+  register_row(row.name, [row, body](benchmark::State& state) {
+    body([&](const Contender& ours, const Contender& floor) {
+      hand_over(state, row, measure(ours, floor, row.limits));
+    });
+  });
+}
+
+void add_figures(const std::string& name, const std::string& floor, const std::function<Comparison()>& figures) {
+  register_row(name, [=](benchmark::State& state) { hand_over(state, {.name = name, .floor = floor}, figures()); });
 }
 
 void add_memory_row(const std::string& name, const std::function<double()>& bytes) {
-  benchmark::RegisterBenchmark(name.c_str(), [bytes](benchmark::State& state) { run_memory_row(state, bytes); })
-      ->UseManualTime()
-      ->Iterations(1);
+  register_row(name, [bytes](benchmark::State& state) {
+    state.counters["bytes"] = bytes();
+    state.SetIterationTime(1e-9);
+  });
 }
 
 }  // namespace bench

@@ -21,6 +21,9 @@ using Body = std::function<void(const Compare& compare)>;
 
 void add_row(const Row& row, const Body& body);
 
+// A pair that measures itself, for information.
+void add_figures(const std::string& name, const std::string& floor, const std::function<Comparison()>& figures);
+
 // A figure in bytes, without a pair.
 void add_memory_row(const std::string& name, const std::function<double()>& bytes);
 
@@ -31,6 +34,8 @@ void add_configuration_rows();
 void add_look_up_rows();
 void add_walk_rows();
 void add_request_rows();
+void add_steering_rows();
+void add_route_rows();
 void add_notification_rows();
 void add_memory_rows();
 void add_daemon_rows();

@@ -10,9 +10,9 @@ namespace bench {
 
 // One side of a comparison.
 struct Contender {
-  std::function<void()> prepare;  // before each batch, not timed; may be empty
-  std::function<void()> run;      // one batch
-  size_t operations = 1;          // how many operations a batch is
+  std::function<void()> prepare = {};  // before each batch, not timed; may be empty
+  std::function<void()> run;           // one batch
+  size_t operations = 1;               // how many operations a batch is
 };
 
 struct Limits {
