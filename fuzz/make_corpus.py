@@ -227,6 +227,75 @@ def segments():
     return inputs
 
 
+def steering_replies(kind):
+    def exchange(answer, adapter=0, address=0, seconds=30, node=1, keep_adapter=0, keep_address=0):
+        return struct.pack("<IIihBB", adapter, address, seconds, node, keep_adapter, keep_address) + answer
+
+    state = struct.pack("<i", 2)
+    hops = b"".join(adapter(0, last_byte=i)[:16] for i in range(11))
+    inputs = {f"status-{status}": exchange(packet(kind, state, value=status)) for status in range(-1, 12)}
+    inputs["route"] = exchange(packet(kind, hops, value=32))
+    inputs["short-route"] = exchange(packet(kind, hops[:175], value=32))
+    inputs["long-length"] = exchange(packet(kind, hops, value=0x10020))
+    inputs["no-message"] = exchange(packet(kind))
+    inputs["three-bytes"] = exchange(packet(kind, state[:3]))
+    inputs["half-a-header"] = exchange(packet(kind, value=1)[:57])
+    inputs["kind-alone"] = exchange(packet(kind)[:4])
+    inputs["nothing"] = exchange(b"")
+    inputs.update({f"kind-{other}": exchange(packet(other, state)) for other in range(16) if other != kind})
+    inputs.update({f"adapter-{number}": exchange(packet(kind, state), adapter=number, keep_adapter=1)
+                   for number in (0, 3, 4, 5, 7, 8, 17, 24, 9000, NO_ADAPTER)})
+    inputs.update({f"address-{i}": exchange(packet(kind, state), address=i) for i in range(8)})
+    inputs["unknown-address"] = exchange(packet(kind, state), address=0x0100007F, keep_address=1)
+    inputs.update({f"node-{node}": exchange(packet(kind, hops, value=16), node=node)
+                   for node in (-1, 0, 3, 5, 6, 2049)})
+    return inputs
+
+
+def routes():
+    def publication(sequence=5, stamps=(5, 5, 4, 0), nonip=(0, 1, 0, 0), current=0, script=b"", node=6):
+        entries = b"".join(struct.pack("<IHH", stamp, 32, mark) + bytes(range(16)) * 11
+                           for stamp, mark in zip(stamps, nonip))
+        lock = struct.pack("<BBxx", current, len(script)) + script
+        return struct.pack("<I", sequence) + entries + lock + struct.pack("<h", node)
+
+    inputs = {"good": publication(), "nothing-published": publication(sequence=0, stamps=(0, 0, 0, 0)),
+              "all-current": publication(current=15),
+              "all-off-ip": publication(current=15, nonip=(1, 2, 0x8000, 0xFFFF)), "negative": publication(node=-1),
+              "far-beyond": publication(node=0x7FFF)}
+    for fault in range(1, 5):
+        inputs[f"entering-{fault}"] = publication(current=15, script=bytes([fault]))
+        inputs[f"leaving-{fault}"] = publication(current=15, script=bytes([0, 1, fault]))
+    return inputs
+
+
+def published_keys():
+    def stored(length, value=b""):
+        return struct.pack("<i", length) + value.ljust(256, b"\0")
+
+    def key(value, claimed=None):
+        marshalled = struct.pack("<III", 1, 2, len(value)) + value
+        return stored(len(marshalled) if claimed is None else claimed, marshalled)
+
+    def segment(previous=stored(0), current=stored(0), cache=()):
+        numbers = struct.pack("<iiiii", 1, 2, 0, 1, 1)
+        slots = [*cache, *[stored(0)] * (10 - len(cache))]
+        cached = b"".join(slots) + struct.pack("<I", len(cache))
+        return struct.pack("<I", 3) + numbers + previous + numbers + current + cached
+
+    good = key(bytes(range(32)))
+    inputs = {"none": segment(), "current": segment(current=good), "both": segment(good, good),
+              "full": segment(good, good, [key(bytes([i] * 24 * i)) for i in range(10)])}
+    bad = {"negative": stored(-1), "too-long": stored(257, bytes(256)), "longest": key(bytes(244)),
+           "header-alone": key(b"", 11), "length-too-small": key(b"8 bytes.", 19),
+           "length-too-large": key(b"8 bytes.", 21)}
+    for name, each in bad.items():
+        inputs[f"current-{name}"] = segment(good, each, [good])
+        inputs[f"previous-{name}"] = segment(each, good, [good])
+        inputs.update({f"cache-{i}-{name}": segment(good, good, [*[good] * i, each, good][:10]) for i in (0, 5, 9)})
+    return inputs
+
+
 def hash_operations():
     inputs = {}
     for kind in range(3):
@@ -247,6 +316,20 @@ def keys():
             "header-alone": key(0, b"", 11)}
 
 
+def routed_messages(request):
+    def message(nodes, text, size=None, count=None):
+        front = struct.pack("<iii40xi", 0x6712, 20, 1, len(nodes) if count is None else count)
+        return request(221, front + struct.pack(f"<{len(nodes)}i", *nodes) +
+                       struct.pack("<i", len(text) if size is None else size) + text)
+
+    return {"routed": message([1, 2, 3], b"text"), "routed-empty": message([1], b""),
+            "routed-nowhere": message([], b"text"), "routed-half": request(221, bytes(7)),
+            "routed-size-too-large": message([1], b"text", 5), "routed-size-too-small": message([1], b"text", 3),
+            "routed-size-negative": message([1], b"text", -1), "routed-descending": message([2, 1], b"text"),
+            "routed-twice": message([1, 1], b"text"), "routed-count-too-large": message([1], b"text", count=2050),
+            "routed-count-negative": message([1], b"text", count=-1)}
+
+
 def requests():
     def request(code, data=b"", length=None):
         header = struct.pack("<iiiihh", 0, 0, code, len(data) if length is None else length, 0, 0)
@@ -263,6 +346,7 @@ def requests():
     inputs["unsubscribe"] = request(UNSUBSCRIBE, b"watch\0")
     inputs["unsubscribe-without-end"] = request(UNSUBSCRIBE, b"watch")
     inputs["number-in-length"] = request(206, bytes(7))
+    inputs.update(routed_messages(request))
     inputs["length-too-large"] = request(206, bytes(7), 98352)
     inputs["length-negative"] = request(206, bytes(7), -1)
     inputs["half-a-header"] = request(201)[:40]
@@ -293,6 +377,7 @@ CORPORA = {
     "adapter_event": lambda: with_hostile(adapter_events(), cursor=5),
     "awaited_reply": exchanges,
     "configuration_at_start": starts,
+    "configure_reply": lambda: steering_replies(CONFIG_ADAPTER),
     "configuration_update": lambda: with_hostile(updates(), flags=6),
     "daemon_request": requests,
     "daemon_stream": request_streams,
@@ -300,15 +385,22 @@ CORPORA = {
                                                group_events=256),
     "event_sequence": sequences,
     "failure_data": lambda: with_hostile(of_kind(other_events(), FAILURE_DATA), group_events=8),
+    "grace_reply": lambda: steering_replies(GRACE),
     "hash": hash_operations,
     "largest_cluster": largest,
     "node_event": lambda: with_hostile(node_events(), group_type=0),
+    "published_keys": published_keys,
+    "published_route": routes,
+    "route_reply": lambda: steering_replies(ROUTE),
     "scenario": scenarios,
     "shared_segments": segments,
+    "state_reply": lambda: steering_replies(STATE),
     "stream": streams,
     "subscription": subscriptions,
+    "swap_reply": lambda: steering_replies(CONFIG_ADAPTER),
     "typed_key": keys,
     "unawaited_kind": lambda: with_hostile(answers()),
+    "unconfigure_reply": lambda: steering_replies(CONFIG_ADAPTER),
 }
 
 

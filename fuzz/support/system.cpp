@@ -18,7 +18,7 @@
 
 namespace fuzz {
 
-System the_system = {{}, {}, {}, 1U << 24U, 0, 0, {1, 1, 1}, sizeof(route_sequence), {}, {}};
+System the_system = {{}, {}, {}, 1U << 24U, 0, 0, 0, {1, 1, 1}, sizeof(route_sequence), {}, {}};
 
 unsigned System::next_fault(unsigned& detail) {
   if (script.empty()) {
@@ -109,6 +109,7 @@ constexpr unsigned nothing_written = 6;
 constexpr int socket_errors[] = {EMFILE};
 constexpr int connect_errors[] = {ECONNREFUSED, ENOENT};
 constexpr int key_errors[] = {ENOENT};
+constexpr int semaphore_errors[] = {EINTR, EIDRM, EINVAL, EACCES};
 constexpr int ipc_errors[] = {EACCES, EINVAL, ENOENT, ENOMEM, ENOSPC, EMFILE, ENFILE};
 
 }  // namespace
@@ -239,6 +240,21 @@ int __wrap_shmdt(const void* /*address*/) {
 int __wrap_semget(key_t key, int count, int flags) {
   REQUIRE(key == HB_SEMAPHORE_SET_ID && count == HB_SEMAPHORE_COUNT && flags == 0);
   return fails(fuzz::ipc_errors) ? -1 : key;
+}
+
+// A reader goes in when nobody writes, and out again. Nobody writes here.
+int __wrap_semop(int id, sembuf* operations, size_t count) {
+  REQUIRE(id == HB_SEMAPHORE_SET_ID && (count == 1 || count == 2));
+  REQUIRE(operations[0].sem_num == HB_READERS_SEMAPHORE && operations[0].sem_op == (count == 2 ? 1 : -1));
+  REQUIRE(operations[0].sem_flg == SEM_UNDO);
+  REQUIRE(count == 1 || (operations[1].sem_num == HB_WRITER_SEMAPHORE && operations[1].sem_op == 0));
+  if (fails(fuzz::semaphore_errors)) {
+    the_system.readers = errno == EINTR ? the_system.readers : 0;  // the set has gone, and its readers with it
+    return -1;
+  }
+  the_system.readers += operations[0].sem_op;
+  REQUIRE(the_system.readers == 0 || the_system.readers == 1);
+  return 0;
 }
 
 }  // extern "C"

@@ -33,6 +33,7 @@ struct System {
   size_t largest_array;  // that there is memory for
   int open_connections;
   int attached_segments;
+  int readers;  // inside the shared memory
 
   memory_configuration_data configuration;
   size_t route_segment_size;  // no larger than route_segment below

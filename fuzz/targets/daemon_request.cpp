@@ -15,6 +15,8 @@ constexpr size_t kind_at = 8;
 constexpr size_t length_at = 12;
 constexpr int32_t subscribe = 209;
 constexpr int32_t unsubscribe = 210;
+constexpr int32_t routed_message = 221;
+constexpr size_t routed_front = 56;
 
 // Requests whose length is the same for every client that keeps to the protocol: none of them may be refused.
 struct Rule {
@@ -39,6 +41,34 @@ bool is_complete(fuzz::Bytes packet) {
          static_cast<int64_t>(number_at(packet, length_at)) == static_cast<int64_t>(packet.size() - header_size);
 }
 
+bool are_ascending_nodes(fuzz::Bytes data, int32_t count) {
+  int32_t before = -1;
+  for (int32_t i = 0; i < count; ++i) {
+    const int32_t node = number_at(data, routed_front + static_cast<size_t>(i) * 4);
+    if (node <= before || node > 2048) {
+      return false;
+    }
+    before = node;
+  }
+  return true;
+}
+
+// A message to be routed as a client sends it: port, hops to live, version, ten words of 0, the nodes, size and bytes.
+bool is_routed_message(fuzz::Bytes data) {
+  if (data.size() < routed_front || data.size() > 10000 || number_at(data, 4) != 20 || number_at(data, 8) != 1 ||
+      std::any_of(data.begin() + 12, data.begin() + 52, [](uint8_t byte) { return byte != 0; })) {
+    return false;
+  }
+  const int64_t count = number_at(data, 52);
+  const int64_t bytes_at = int64_t{routed_front} + count * 4 + 4;
+  if (number_at(data, 0) < 0 || number_at(data, 0) > 65535 || count < 1 || count > 2049 ||
+      bytes_at > static_cast<int64_t>(data.size())) {
+    return false;
+  }
+  return are_ascending_nodes(data, static_cast<int32_t>(count)) &&
+         number_at(data, static_cast<size_t>(bytes_at) - 4) == static_cast<int64_t>(data.size()) - bytes_at;
+}
+
 bool has_to_be_accepted(fuzz::Bytes packet) {
   if (!is_complete(packet)) {
     return false;
@@ -52,6 +82,9 @@ bool has_to_be_accepted(fuzz::Bytes packet) {
   if (code == unsubscribe) {
     const fuzz::Bytes name = packet.subspan(header_size);
     return length >= 1 && length <= 32 && std::find(name.begin(), name.end(), 0) != name.end();
+  }
+  if (code == routed_message) {
+    return is_routed_message(packet.subspan(header_size));
   }
   return std::any_of(rules.begin(), rules.end(), [=](const Rule& rule) {
     return rule.code == code && length >= rule.shortest && length <= rule.longest;
@@ -102,6 +135,15 @@ void check_subscription(const hbd::Subscription& subscription, fuzz::Bytes packe
   REQUIRE(list.size() == 1 && list.remove(subscription.name) && list.size() == 0);
 }
 
+// What is passed on names nodes that there can be, each once, and as many bytes as there are.
+void check_routed_message(const hbd::RoutingMessage& message, fuzz::Bytes data) {
+  REQUIRE(!message.nodes.empty() && message.nodes.size() == static_cast<size_t>(number_at(data, 52)));
+  REQUIRE(are_ascending_nodes(data, static_cast<int32_t>(message.nodes.size())));
+  REQUIRE(message.port == static_cast<uint16_t>(data[0] << 8U | data[1]));
+  const fuzz::Bytes end = data.last(message.bytes.size());
+  REQUIRE(std::equal(end.begin(), end.end(), message.bytes.begin()));
+}
+
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, size_t size) {
@@ -116,6 +158,9 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, size_t size) {
   if (const auto* plain = std::get_if<hbd::PlainRequest>(&request)) {
     REQUIRE(plain->code == code && code >= 201 && code <= 227 && code != subscribe && code != unsubscribe);
     REQUIRE(plain->number == number_at(packet, length_at));
+    if (code == routed_message) {
+      check_routed_message(std::get<hbd::RoutingMessage>(plain->data), packet.subspan(header_size));
+    }
   } else if (const auto* registration = std::get_if<hbd::SubscribeRequest>(&request)) {
     REQUIRE(code == subscribe);
     check_subscription(registration->subscription, packet);

@@ -1,0 +1,7 @@
+// The answer to a request for another address.
+#include "support/steering_reply.h"
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* bytes, size_t size) {
+  fuzz::run_steering_reply(fuzz::Awaited::configure, {bytes, size});
+  return 0;
+}
