@@ -35,6 +35,15 @@ TEST(HbctlEventText, shows_an_adapter_that_is_not_configured_by_its_number_alone
   EXPECT_THAT(event_line(event, WatchState(sample_cluster()), kPlain), EndsWith("death               99\n"));
 }
 
+TEST(HbctlEventText, shows_a_group_of_adapters_without_a_leader) {
+  Event event = event_of(4);
+  event.subject = Subject::Adapters;
+  event.identity = {0xFFFFFFFF, 5};
+  event.stable = true;
+  EXPECT_THAT(event_line(event, WatchState(sample_cluster()), kPlain),
+              HasSubstr("none; no leader, incarnation 5, stable"));
+}
+
 TEST(HbctlEventText, shows_an_empty_group_as_none) {
   Event event = event_of(4);
   event.subject = Subject::Nodes;

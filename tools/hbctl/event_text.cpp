@@ -44,10 +44,13 @@ std::string describe_members(const Event& event, const WatchState& state) {
   return text;
 }
 
+std::string describe_identity(const GroupIdentity& identity) {
+  const std::string leader = identity.leader == HB_NO_ADAPTER ? "no leader" : fmt::format("leader {}", identity.leader);
+  return fmt::format("{}, incarnation {}, ", leader, identity.incarnation);
+}
+
 std::string describe_group(const Event& event) {
-  std::string text =
-      event.identity ? fmt::format("leader {}, incarnation {}, ", event.identity->leader, event.identity->incarnation)
-                     : "";
+  const std::string text = event.identity ? describe_identity(*event.identity) : "";
   return event.stable ? text + (*event.stable ? "stable" : "unstable") : text;
 }
 

@@ -17,32 +17,30 @@ struct Options {
   std::string command;
   std::string socket;  // empty: the environment's
   std::string colour = "auto";
-  bool json = false;
-  double wait = 1.0;    // seconds for the daemon to say who is up
-  Selection selection;  // adapters and watch
-  Hb_Events events = 0;
   std::string name_prefix = "hbctl";
-  std::optional<uint32_t> count;
+  std::string action;              // a word of adapter_action.h or node_action.h
+  std::string value;               // of an adapter's action; fits it
+  std::string text;                // to send; "-" is standard input
+  std::string interface;           // empty: all
+  Selection selection;             // adapters, watch and send
+  double wait = 1.0;               // seconds for the daemon to say what it is asked
   std::optional<double> duration;  // seconds
-  bool discard_stale = false;
-
-  // Of the commands that steer.
-  bool yes = false;  // agreed to what is dangerous
+  std::optional<double> every;     // seconds between heartbeats
+  std::optional<uint32_t> count;
+  Hb_Events events = 0;
   Hb_Adapter_Number adapter = 0;
+  uint32_t sequence = 1;  // of the first heartbeat
+  int port = 0;
+  int seconds = 0;
   Hb_Node_Number node = 0;
-  std::string action;  // a word of adapter_action.h or node_action.h
-  std::string value;   // of an adapter's action; fits it
+  bool json = false;
+  bool discard_stale = false;
+  bool yes = false;  // agreed to what is dangerous
   bool from_daemon = false;
   bool ip = false;
   bool reveal = false;
-  int port = 0;
-  std::string text;  // to send; "-" is standard input
-  uint32_t sequence = 1;
-  std::optional<double> every;  // seconds between heartbeats
   bool settings = false;
-  int seconds = 0;
   bool on = false;
-  std::string interface;  // empty: all
 };
 
 // Fills `options`, or returns the exit status when there is nothing left to do: help, the version, or a mistake, each
