@@ -151,7 +151,7 @@ class KilledPublisher : public testing::Test {
   std::string free_path() {
     hbd::Loop loop;
     for (int i = 0;; ++i) {
-      const std::string path = directory_.write(std::to_string(i), "");
+      std::string path = directory_.write(std::to_string(i), "");
       try {
         const hbd::Publisher publisher(loop, path, {{1, nodes, 1}, {}}, std::chrono::seconds(1));
         return path;
