@@ -214,6 +214,44 @@ TEST_F(HbctlWithDaemon, counts_who_is_up_after_each_event) {
   EXPECT_EQ(nodes, json({{"up", 3}, {"down", 0}, {"unknown", 0}}));
 }
 
+// What a watch of the adapter shows next, without the groups.
+json next_change(ChildProcess& watch) {
+  json event;
+  do {
+    event = json::parse(watch.read_line());
+  } while (event["event"] == "new-group");
+  return event;
+}
+
+TEST_F(HbctlWithDaemon, steers_what_a_watch_beside_it_sees) {
+  ChildProcess watch(hbctl({"watch", "--json", "--adapter", "1", "--events", "death", "join", "new-group"}));
+  ASSERT_EQ(json::parse(watch.read_line())["event"], "new-group");  // it has subscribed
+  EXPECT_EQ(run({"adapter", "1", "ifdown", "--yes"}).status, 0);
+  EXPECT_EQ(next_change(watch)["event"], "death");
+  EXPECT_EQ(run({"adapter", "1", "state"}).output, "adapter 1: interface-down\n");
+  EXPECT_EQ(run({"adapter", "1", "ifup"}).status, 0);
+  EXPECT_EQ(next_change(watch)["event"], "join");
+  EXPECT_EQ(run({"adapter", "1", "configure", "10.0.1.9"}).status, 6);
+  EXPECT_EQ(run({"adapter", "1", "disable", "--yes"}).status, 0);
+  EXPECT_EQ(run({"adapter", "1", "configure", "10.0.1.9"}).status, 0);
+  EXPECT_EQ(next_change(watch)["addresses_changed"], json({1}));
+  const json again = next_change(watch);
+  EXPECT_EQ(again["event"], "join");
+  EXPECT_EQ(again["adapters"][0]["address"], "10.0.1.9");
+}
+
+TEST_F(HbctlWithDaemon, reads_what_it_publishes_and_answers) {
+  for (const char* option : {"--ip", "--from-daemon"})
+    EXPECT_EQ(json::parse(run({"route", "1", "--json", option}).output)["hops"], json({"10.0.0.2"})) << option;
+  EXPECT_EQ(run({"route", "2"}).status, 1);
+  const json keys = json::parse(run({"security", "--json"}).output);
+  EXPECT_EQ(keys["current"]["key"], json({{"type", 1}, {"key_version", 1}, {"length", 32}}));
+  EXPECT_EQ(keys["previous"]["key"], nullptr);
+  const Finished heartbeat = run({"heartbeat", "--settings", "--json"});
+  EXPECT_THAT(heartbeat.output, HasSubstr("\"threshold\":5.0,\"watched\":true"));
+  EXPECT_EQ(heartbeat.status, 0);
+}
+
 TEST_F(HbctlWithDaemon, ends_with_the_daemon_and_finds_none_afterwards) {
   ChildProcess watch(hbctl({"watch", "--node", "0", "--events", "new-group"}));
   watch.read_line();

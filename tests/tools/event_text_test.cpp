@@ -44,6 +44,15 @@ TEST(HbctlEventText, shows_a_group_of_adapters_without_a_leader) {
               HasSubstr("none; no leader, incarnation 5, stable"));
 }
 
+TEST(HbctlEventText, says_whose_address_a_configuration_changes) {
+  WatchState state(sample_cluster());
+  Cluster next = sample_cluster();
+  next.adapters[1].address = "10.0.0.99";
+  state.replace_cluster(next);
+  EXPECT_THAT(event_line(event_of(128), state, kPlain),
+              EndsWith("3 nodes, 6 adapters, 2 networks; addresses changed of adapters 1\n"));
+}
+
 TEST(HbctlEventText, shows_an_empty_group_as_none) {
   Event event = event_of(4);
   event.subject = Subject::Nodes;

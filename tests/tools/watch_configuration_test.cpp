@@ -70,7 +70,8 @@ TEST(HbctlWatchConfiguration, tells_what_came_and_went_in_json) {
                          {"subscription", "Hb_Config_Group"},
                          {"configured", {{"nodes", 2}, {"adapters", 2}, {"networks", 1}, {"sites", 0}}},
                          {"added", {{"nodes", json::array()}, {"adapters", json::array()}}},
-                         {"removed", {{"nodes", {2}}, {"adapters", {1, 3, 4, 5}}}}};
+                         {"removed", {{"nodes", {2}}, {"adapters", {1, 3, 4, 5}}}},
+                         {"addresses_changed", json::array()}};
   EXPECT_EQ(event, expected);
 }
 

@@ -30,6 +30,16 @@ TEST(HbctlWatchState, tells_of_no_change_when_there_is_none) {
   EXPECT_THAT(change.nodes_removed, IsEmpty());
   EXPECT_THAT(change.adapters_added, IsEmpty());
   EXPECT_THAT(change.adapters_removed, IsEmpty());
+  EXPECT_THAT(change.addresses_changed, IsEmpty());
+}
+
+TEST(HbctlWatchState, tells_of_adapters_with_another_address_alone) {
+  Cluster next = sample_cluster();
+  next.adapters[1].address = "10.0.0.99";
+  next.adapters[4].address = "";
+  next.adapters.erase(next.adapters.begin());
+  next.adapters.push_back({14, Hb_Node_Number{2}, 0, Hb_Network_Number{0}, "ether", "10.0.0.15"});
+  EXPECT_THAT(compare(sample_cluster(), next).addresses_changed, ElementsAre(1U, 4U));
 }
 
 TEST(HbctlWatchState, finds_adapters_of_the_new_configuration) {

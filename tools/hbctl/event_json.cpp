@@ -48,6 +48,7 @@ void add_configuration(Json& json, const WatchState& state) {
                         {"sites", cluster.sites.size()}};
   json["added"] = {{"nodes", change.nodes_added}, {"adapters", change.adapters_added}};
   json["removed"] = {{"nodes", change.nodes_removed}, {"adapters", change.adapters_removed}};
+  json["addresses_changed"] = change.addresses_changed;
 }
 
 }  // namespace

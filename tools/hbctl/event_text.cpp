@@ -72,7 +72,8 @@ std::string describe_configuration(const WatchState& state) {
                            count_of(static_cast<int64_t>(cluster.networks.size()), "network")),
                change_text("nodes added", change.nodes_added), change_text("nodes removed", change.nodes_removed),
                change_text("adapters added", change.adapters_added),
-               change_text("adapters removed", change.adapters_removed)});
+               change_text("adapters removed", change.adapters_removed),
+               change_text("addresses changed of adapters", change.addresses_changed)});
 }
 
 std::string describe(const Event& event, const WatchState& state) {

@@ -16,13 +16,23 @@ std::vector<Number> difference(std::vector<Number> from, std::vector<Number> wit
   return result;
 }
 
+std::vector<Hb_Adapter_Number> with_another_address(const Cluster& before, const Cluster& after) {
+  const AdapterIndex index(before);
+  std::vector<Hb_Adapter_Number> result;
+  for (const Adapter& adapter : after.adapters) {
+    const Adapter* old = index.find(adapter.number);
+    if (old != nullptr && old->address != adapter.address) result.push_back(adapter.number);
+  }
+  return result;
+}
+
 }  // namespace
 
 ConfigurationChange compare(const Cluster& before, const Cluster& after) {
   return {difference(after.node_numbers(), before.node_numbers()),
           difference(before.node_numbers(), after.node_numbers()),
           difference(after.adapter_numbers(), before.adapter_numbers()),
-          difference(before.adapter_numbers(), after.adapter_numbers())};
+          difference(before.adapter_numbers(), after.adapter_numbers()), with_another_address(before, after)};
 }
 
 void WatchState::replace_cluster(Cluster cluster) {

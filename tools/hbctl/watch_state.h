@@ -11,6 +11,7 @@ struct ConfigurationChange {
   std::vector<Hb_Node_Number> nodes_removed;
   std::vector<Hb_Adapter_Number> adapters_added;
   std::vector<Hb_Adapter_Number> adapters_removed;
+  std::vector<Hb_Adapter_Number> addresses_changed;  // adapters with another address than before
 };
 
 ConfigurationChange compare(const Cluster& before, const Cluster& after);
