@@ -92,7 +92,10 @@ void Cluster::change(const AdapterSilence& silence, Delta& /*delta*/) {
 }
 
 void Cluster::change(const ReportedDeath& report, Delta& delta) {
-  set_working(report.adapters, false, Cause::Request, delta);
+  for_each_configured(report.adapters, [&](const Adapter& adapter) {
+    steering_[adapter.number].reported_down = true;
+    settle(adapter, Cause::Request, delta);
+  });
 }
 
 void Cluster::change(const SuspicionEnd& end, Delta& delta) {
@@ -101,8 +104,10 @@ void Cluster::change(const SuspicionEnd& end, Delta& delta) {
 
 void Cluster::change(const MonitoringSwitch& wanted, Delta& delta) {
   for_each_configured({wanted.adapter}, [&](const Adapter& adapter) {
-    const bool before = std::exchange(steering_[adapter.number].monitored, wanted.on);
+    Steering& steering = steering_[adapter.number];
+    const bool before = std::exchange(steering.monitored, wanted.on);
     if (wanted.on && !before) {
+      steering.reported_down = false;
       tell_again(adapter, delta);
     }
   });
@@ -110,15 +115,19 @@ void Cluster::change(const MonitoringSwitch& wanted, Delta& delta) {
 
 void Cluster::change(const InterfaceSwitch& wanted, Delta& delta) {
   for_each_configured({wanted.adapter}, [&](const Adapter& adapter) {
-    steering_[adapter.number].interface_on = wanted.on;
+    Steering& steering = steering_[adapter.number];
+    steering.interface_on = wanted.on;
+    steering.reported_down = steering.reported_down && !wanted.on;
     settle(adapter, Cause::Request, delta);
   });
 }
 
 void Cluster::change(const GraceSwitch& grace, Delta& delta) {
   for_each_configured({grace.adapter}, [&](const Adapter& adapter) {
-    steering_[adapter.number].has_grace = grace.on;
-    settle(adapter, Cause::Monitor, delta);
+    Steering& steering = steering_[adapter.number];
+    steering.has_grace = grace.on;
+    const bool is_owed = std::exchange(steering.request_is_held, false);
+    settle(adapter, is_owed ? Cause::Request : Cause::Monitor, delta);
   });
 }
 
@@ -158,8 +167,18 @@ void Cluster::for_each_configured(const std::vector<Hb_Adapter_Number>& adapters
 void Cluster::set_working(const std::vector<Hb_Adapter_Number>& adapters, bool working, Cause cause, Delta& delta) {
   for_each_configured(adapters, [&](Adapter& adapter) {
     adapter.up = working;
+    if (working) {
+      forget_report(adapter.number);
+    }
     settle(adapter, cause, delta);
   });
+}
+
+void Cluster::forget_report(Hb_Adapter_Number number) {
+  const auto found = steering_.find(number);
+  if (found != steering_.end()) {
+    found->second.reported_down = false;
+  }
 }
 
 void Cluster::set_running(Hb_Node_Number node, bool running, Delta& delta) {
@@ -168,6 +187,9 @@ void Cluster::set_running(Hb_Node_Number node, bool running, Delta& delta) {
   const auto& adapters = configuration_.adapters;
   const auto end = adapters.lower_bound(configuration_.adapter_number(node + 1, 0));
   for (auto each = adapters.lower_bound(configuration_.adapter_number(node, 0)); each != end; ++each) {
+    if (running) {
+      forget_report(each->first);
+    }
     settle(each->second, Cause::Request, delta);
   }
 }
@@ -205,7 +227,7 @@ bool Cluster::has_adapters(Hb_Node_Number node) const {
 bool Cluster::should_be_up(const Adapter& adapter) const {
   const auto node = static_cast<std::size_t>(configuration_.node_of(adapter.number));
   const Steering steering = steering_of(adapter.number);
-  return adapter.up && steering.has_address && steering.interface_on && runs_[node] &&
+  return adapter.up && steering.has_address && steering.interface_on && !steering.reported_down && runs_[node] &&
          available_[static_cast<std::size_t>(adapter.network)];
 }
 
@@ -237,7 +259,11 @@ Hb_Adapter_state_t Cluster::state(Hb_Adapter_Number adapter) const {
 
 void Cluster::settle(const Adapter& adapter, Cause cause, Delta& delta) {
   const bool wanted = should_be_up(adapter);
-  if (wanted == up_adapters_.contains(adapter.number) || is_held(adapter, wanted, cause)) {
+  if (wanted == up_adapters_.contains(adapter.number)) {
+    return;
+  }
+  if (is_held(adapter, wanted, cause)) {
+    steering_[adapter.number].request_is_held |= cause == Cause::Request && steering_of(adapter.number).has_grace;
     return;
   }
   if (wanted) {

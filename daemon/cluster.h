@@ -18,7 +18,8 @@ namespace hbd {
 /**
  * Configuration and membership of one cluster.
  *
- * An adapter is up while it works, has an address, its interface is on, its node runs and its network carries. A node
+ * An adapter is up while it works, has an address, its interface is on, nobody has reported it down since it last
+ * joined with or without its node, was switched on or watched anew, its node runs and its network carries. A node
  * is up while it runs and one of its adapters is up. All adapters that are up form one adapter group, all nodes that
  * are up one node group; the lowest number leads.
  *
@@ -83,11 +84,14 @@ class Cluster {
     bool interface_on = true;
     bool has_grace = false;
     bool has_address = true;
+    bool reported_down = false;   /* until something is done about it */
+    bool request_is_held = false; /* a request would have changed the state, but for the time of grace */
   };
 
   void set_working(const std::vector<Hb_Adapter_Number>& adapters, bool working, Cause cause, Delta& delta);
   template <typename Visit>
   void for_each_configured(const std::vector<Hb_Adapter_Number>& adapters, Visit visit);
+  void forget_report(Hb_Adapter_Number number);
   void set_running(Hb_Node_Number node, bool running, Delta& delta);
   void set_available(Hb_Network_Number network, bool available, Delta& delta);
   void remove_adapter(Hb_Adapter_Number number, Delta& delta);

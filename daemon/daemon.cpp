@@ -8,6 +8,18 @@
 #include "failure.h"
 
 namespace hbd {
+namespace {
+
+const char* outcome_of(const SuspicionEnd& suspicion, bool has_events, const Cluster& cluster) {
+  if (has_events) {
+    return "confirmed by their silence";
+  }
+  const bool lives = std::any_of(suspicion.adapters.begin(), suspicion.adapters.end(),
+                                 [&](auto number) { return cluster.up_adapters().contains(number); });
+  return lives ? "cleared by their heartbeats" : "over: they were down before";
+}
+
+}  // namespace
 
 Daemon::Daemon(Loop& loop, const std::string& path, MembershipSource& source, std::size_t queue_bytes,
                const ServiceSettings& settings)
@@ -43,7 +55,7 @@ void Daemon::apply(const Change& change) {
   }
   if (const auto* suspicion = std::get_if<SuspicionEnd>(&change)) {
     spdlog::info("the suspicion of adapters {} is {}", fmt::join(suspicion->adapters, ", "),
-                 events.empty() ? "cleared by their heartbeats" : "confirmed by their silence");
+                 outcome_of(*suspicion, !events.empty(), cluster_));
   }
 }
 

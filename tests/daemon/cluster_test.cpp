@@ -194,6 +194,57 @@ TEST(Grace, holds_a_death_back_and_nothing_else) {
   EXPECT_THAT(named(cluster.apply(hbd::AdapterJoin{{2}}), hbd::Direction::Join), ElementsAre(2));
 }
 
+TEST(Grace, tells_at_its_end_what_a_request_did_to_an_interface_under_manual_control) {
+  auto configuration = three_nodes();
+  configuration.local_node = 1;
+  configuration.adapters[2].type = "en0";
+  Cluster cluster(configuration);
+  cluster.apply(hbd::ManualControl{"en0", true});
+  cluster.apply(hbd::GraceSwitch{2, true});
+  EXPECT_THAT(cluster.apply(hbd::InterfaceSwitch{2, false}), IsEmpty());
+  EXPECT_THAT(named(cluster.apply(hbd::GraceSwitch{2, false}), hbd::Direction::Death), ElementsAre(2));
+}
+
+TEST(Grace, tells_nothing_at_its_end_of_what_a_monitor_under_manual_control_saw) {
+  auto configuration = three_nodes();
+  configuration.local_node = 1;
+  configuration.adapters[2].type = "en0";
+  Cluster cluster(configuration);
+  cluster.apply(hbd::ManualControl{"en0", true});
+  cluster.apply(hbd::GraceSwitch{2, true});
+  EXPECT_THAT(cluster.apply(hbd::AdapterDeath{{2}}), IsEmpty());
+  EXPECT_THAT(cluster.apply(hbd::GraceSwitch{2, false}), IsEmpty());
+}
+
+/* A change after which an adapter that was reported down is up again. */
+struct Revival {
+  const char* name;
+  std::vector<hbd::Change> changes;
+};
+
+class ReportedAdapter : public testing::TestWithParam<Revival> {};
+
+TEST_P(ReportedAdapter, stays_dead_until_this) {
+  Cluster cluster(three_nodes());
+  EXPECT_THAT(named(cluster.apply(hbd::ReportedDeath{{2}}), hbd::Direction::Death), ElementsAre(2));
+  EXPECT_EQ(cluster.state(2), Hb_Adapter_Down);
+  EXPECT_THAT(cluster.apply(hbd::SuspicionEnd{{2}}), IsEmpty());
+  std::vector<Hb_Adapter_Number> joined;
+  for (const auto& change : GetParam().changes) {
+    EXPECT_FALSE(cluster.up_adapters().contains(2));
+    joined = named(cluster.apply(change), hbd::Direction::Join);
+  }
+  EXPECT_THAT(joined, testing::Contains(2U));
+}
+
+INSTANTIATE_TEST_SUITE_P(Cluster, ReportedAdapter,
+                         testing::Values(Revival{"its_join", {hbd::AdapterJoin{{2}}}},
+                                         Revival{"its_interface_is_switched_on", {hbd::InterfaceSwitch{2, true}}},
+                                         Revival{"it_is_watched_anew",
+                                                 {hbd::MonitoringSwitch{2, false}, hbd::MonitoringSwitch{2, true}}},
+                                         Revival{"its_node_joins", {hbd::NodeDeath{1, {}}, hbd::NodeJoin{1, {}}}}),
+                         [](const auto& each) { return std::string(each.param.name); });
+
 TEST(Silence, is_noticed_by_suspicion_alone) {
   Cluster cluster(three_nodes());
   EXPECT_THAT(cluster.apply(hbd::AdapterSilence{{2}}), IsEmpty());

@@ -82,6 +82,20 @@ TEST(Suspicion, of_a_node_concerns_its_adapters) {
   EXPECT_THAT(daemon.process().log(), HasSubstr("the suspicion of adapters 0, 1 is cleared"));
 }
 
+TEST(Suspicion, of_an_adapter_that_is_down_is_not_called_cleared) {
+  ScriptedDaemon daemon(silence_of_4, 2, with_short_suspicion());
+  Connection client(daemon.socket());
+  client.subscribe(SubscriptionType::AllAdapters, 1, "s");
+  daemon.go(client);
+  client.send(request_with_number(206, 2));
+  ASSERT_TRUE(client.receive());
+  client.send(ByteWriter().raw(request_with_number(205, 2)).raw(request_with_number(205, 4)).bytes());
+  const auto event = client.receive();
+  ASSERT_TRUE(event);
+  EXPECT_THAT(adapters_in(*event), ElementsAre(4));
+  EXPECT_THAT(daemon.process().log(), HasSubstr("the suspicion of adapters 2 is over: they were down before"));
+}
+
 TEST(Report, of_somebody_unknown_changes_nothing) {
   ScriptedDaemon daemon("", 2, with_short_suspicion());
   Connection client(daemon.socket());
