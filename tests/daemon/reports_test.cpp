@@ -87,6 +87,7 @@ TEST(Suspicion, of_an_adapter_that_is_down_is_not_called_cleared) {
   Connection client(daemon.socket());
   client.subscribe(SubscriptionType::AllAdapters, 1, "s");
   daemon.go(client);
+  EXPECT_THAT(daemon.packets(client), IsEmpty());
   client.send(request_with_number(206, 2));
   ASSERT_TRUE(client.receive());
   client.send(ByteWriter().raw(request_with_number(205, 2)).raw(request_with_number(205, 4)).bytes());
