@@ -34,11 +34,11 @@ struct Operation_Outputs {
     std::memset(&bytes, 0xB7, sizeof bytes);
     nodes = {4, 0, 3};
   }
-  bool untouched() const {
+  bool bytes_untouched() const {
     const auto* first = reinterpret_cast<const uint8_t*>(&bytes);
-    return std::all_of(first, first + sizeof bytes, [](uint8_t byte) { return byte == 0xB7; }) &&
-           nodes == std::array<int, 3>{4, 0, 3};
+    return std::all_of(first, first + sizeof bytes, [](uint8_t byte) { return byte == 0xB7; });
   }
+  bool untouched() const { return bytes_untouched() && nodes == std::array<int, 3>{4, 0, 3}; }
 
   struct {
     Hb_Adapter_state_t state;

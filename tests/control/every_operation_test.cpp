@@ -5,6 +5,7 @@
 #include <cerrno>
 
 #include "control_operations.h"
+#include "support/allocation_faults.h"
 #include "support/system_calls.h"
 
 namespace hb_test {
@@ -119,6 +120,50 @@ TEST_P(EveryOperation, TakesNoMutex) {
   const bool reads_routes = GetParam().without_connection == 6;
   EXPECT_EQ(reads_routes ? 2U : 0U, calls.of("semop").size());
   hb_terminate();
+}
+
+TEST_P(EveryOperation, TracesNothing) {
+  FakeDaemon daemon(Publication::for_nodes(8));
+  daemon.write_segment(Segment::route, size_t{4} * 184, good_route());
+  DaemonConnection connection = start_client(daemon, sparse_cluster());
+  trace_all();
+  if (!GetParam().answer.empty()) {
+    connection.send_frame(GetParam().answer);
+  }
+  EXPECT_TRUE(succeeds(call));
+  connection.close();
+  call();
+  EXPECT_TRUE(platform_double().traces.empty());
+  trace_nothing();
+  hb_terminate();
+}
+
+TEST_P(EveryOperation, FailsWhereMemoryRunsOut) {
+  bool happened = true;
+  for (size_t nth = 1; happened; ++nth) {
+    FakeDaemon daemon(Publication::for_nodes(8));
+    daemon.write_segment(Segment::route, size_t{4} * 184, good_route());
+    DaemonConnection connection = start_client(daemon, sparse_cluster());
+    if (!GetParam().answer.empty()) {
+      connection.send_frame(GetParam().answer);
+    }
+    operation_outputs.clear();
+    Hb_Rc result = Hb_Success;
+    const long live = live_allocations();
+    {
+      const AllocationFailure failure(nth);
+      result = call();
+      happened = failure.happened();
+    }
+    EXPECT_EQ(live, live_allocations()) << nth;
+    EXPECT_EQ(happened ? Hb_Failure : Hb_Success, result) << nth;
+    if (happened) {
+      // What was asked is not sent, or its answer not read.
+      EXPECT_EQ(connection.has_input() ? 12 : 17, hb_get_errno()) << nth;
+      EXPECT_TRUE(operation_outputs.bytes_untouched()) << nth;
+    }
+    hb_terminate();
+  }
 }
 
 INSTANTIATE_TEST_SUITE_P(Control, EveryOperation, testing::ValuesIn(operations_that_start()), name_of_operation);

@@ -3,6 +3,7 @@
 
 #include <functional>
 #include <ostream>
+#include <utility>
 
 #include "hash.h"
 #include "hb_communication/control_requests.h"
@@ -159,6 +160,16 @@ TEST_F(LocalAdapter, MayGetAnyGrace) {
     const auto byte = static_cast<uint8_t>(seconds);
     EXPECT_TRUE(sent(request_with(216, octets({0, 0, 0, 0, byte, byte, byte, byte}))));
   }
+}
+
+TEST_F(LocalAdapter, IsNotFoundInATableThatIsNotThere) {
+  H_table_str* const adapters = std::exchange(global_config_tbl.adap_hash, nullptr);
+  H_table_str* const addresses = std::exchange(global_config_tbl.ip_hash, nullptr);
+  EXPECT_TRUE(refuses(7, [] { return hb_enable_adapter(13); }));
+  EXPECT_TRUE(refuses(7, [] { return hb_swap_adapters(13, ipv4({10, 0, 0, 3})); }));
+  EXPECT_TRUE(refuses(7, [] { return hb_adapter_is_down(13); }));
+  global_config_tbl.adap_hash = adapters;
+  global_config_tbl.ip_hash = addresses;
 }
 
 TEST_F(LocalAdapter, IsNotAskedForItsStateWithoutAPlaceForIt) {

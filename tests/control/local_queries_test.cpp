@@ -44,6 +44,10 @@ TEST_F(HeartbeatSettings, AreThoseOfTheLastEvent) {
   EXPECT_EQ(250000, settings.client_hb_thresh.tv_usec);
   EXPECT_EQ(Hb_True, settings.client_hb_is_enabled);
   EXPECT_EQ(4711, settings.client_hb_daemon_pid);
+  const Bytes first = bytes();
+  std::memset(&settings, 0xB7, sizeof settings);
+  EXPECT_TRUE(succeeds([this] { return hb_get_client_hb_info(&settings); }));
+  EXPECT_EQ(first, bytes());  // and stay
   EXPECT_TRUE(nothing_sent());
 }
 

@@ -91,6 +91,17 @@ TEST_P(PublishedRoute, IsReadWithLengthAndHops) {
   EXPECT_EQ(some_hops(), out.hops());
 }
 
+TEST_P(PublishedRoute, HasElevenHopsOf16Bytes) {
+  publish_route(4, 7, 1, 0, some_hops());
+  EXPECT_TRUE(is_read(4));
+  ASSERT_EQ(176U, sizeof out.route);
+  ASSERT_EQ(11U, std::size(out.route.sr_address));
+  for (size_t hop = 0; hop < 11; ++hop) {
+    const Bytes address(reinterpret_cast<const char*>(&out.route.sr_address[hop]), sizeof out.route.sr_address[hop]);
+    EXPECT_EQ(some_hops().substr(hop * 16, 16), address);
+  }
+}
+
 TEST_P(PublishedRoute, IsFoundByItsNode) {
   for (size_t node = 0; node < 8; ++node) {
     publish_route(node, 7, static_cast<uint16_t>(100 + node), 0, Bytes(176, static_cast<char>('a' + node)));
@@ -260,6 +271,41 @@ TEST_P(PublishedRoute, ThatIsGoneWhenTheDaemonHasWrittenIsNone) {
   EXPECT_EQ(6, hb_get_errno());
   EXPECT_TRUE(out.untouched());
   EXPECT_EQ(0, lock.readers());
+}
+
+// The reader is made to wait where it leaves: what is published from then on is not seen any more.
+TEST_P(PublishedRoute, IsCopiedAndComparedBeforeTheReaderLeaves) {
+  publish_route(4, 7, 1, 0, Bytes(176, 'o'));
+  std::atomic<Hb_Rc> result = Hb_Failure;
+  std::thread reader([&] {
+    SystemCalls calls;
+    calls.script("semop", {hb_test::result(0)});  // it does not enter
+    result = read(4);
+  });
+  lock.await_leaving_reader();
+  publish_route(4, 8, 2, 1, Bytes(176, 'n'));
+  lock.set_readers(1);
+  reader.join();
+  EXPECT_EQ(Hb_Success, result);
+  EXPECT_EQ(1, out.length);
+  EXPECT_EQ(Bytes(176, 'o'), out.hops());
+  EXPECT_EQ(0, lock.readers());
+}
+
+TEST_P(PublishedRoute, IsComparedWithTheConfigurationBeforeTheReaderLeaves) {
+  publish_route(4, 7, 1, 0, some_hops());
+  std::atomic<Hb_Rc> result = Hb_Failure;
+  std::thread reader([&] {
+    SystemCalls calls;
+    calls.script("semop", {hb_test::result(0)});
+    result = read(4);
+  });
+  lock.await_leaving_reader();
+  publish_configuration(8);
+  lock.set_readers(1);
+  reader.join();
+  EXPECT_EQ(Hb_Success, result);
+  EXPECT_EQ(some_hops(), out.hops());
 }
 
 TEST_P(PublishedRoute, HoldsNothingWhenItsReaderIsCancelledWhileItWaits) {

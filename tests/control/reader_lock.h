@@ -23,6 +23,10 @@ class Reader_Lock {
   void await_waiting_reader() const {
     await([this] { return control(1, GETZCNT) == 1; });
   }
+  // Waits until somebody leaves who was not counted, and so waits for a reader to be counted.
+  void await_leaving_reader() const {
+    await([this] { return control(0, GETNCNT) == 1; });
+  }
 
   // Throws when it does not come true within ten seconds.
   template <typename Condition>

@@ -105,6 +105,25 @@ class SecurityKeys : public Steering {
   Outputs out;
 };
 
+// Programs are compiled against these places.
+TEST(SecurityRecords, LieInTheirOrder) {
+  EXPECT_EQ(0U, offsetof(sec_key_desc, type));
+  EXPECT_EQ(4U, offsetof(sec_key_desc, version));
+  EXPECT_EQ(8U, offsetof(sec_key_desc, length));
+  EXPECT_EQ(16U, offsetof(sec_key_desc, value));
+  EXPECT_EQ(24U, offsetof(sec_key_desc, schedule));
+  EXPECT_EQ(0U, offsetof(Hb_Security_Status, securityOn));
+  EXPECT_EQ(4U, offsetof(Hb_Security_Status, keyCount));
+  EXPECT_EQ(8U, offsetof(Hb_Security_Status, TRELL_compatible));
+  EXPECT_EQ(12U, offsetof(Hb_Security_Status, is_valid_for_signing));
+  EXPECT_EQ(16U, offsetof(Hb_Security_Status, is_valid_for_authenticating));
+  EXPECT_EQ(24U, offsetof(Hb_Security_Status, key));
+  EXPECT_EQ(56U, sizeof(Hb_Security_Status));
+  EXPECT_EQ(0U, offsetof(Hb_Key_Cache, keyCache));
+  EXPECT_EQ(320U, offsetof(Hb_Key_Cache, keyCacheCount));
+  EXPECT_EQ(328U, sizeof(Hb_Key_Cache));
+}
+
 TEST_F(SecurityKeys, HaveASequenceNumber) {
   publish(0, ByteBuilder().u32(0xFEDCBA98).bytes());
   Hb_Sequence_Number sequence = 0;
