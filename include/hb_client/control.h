@@ -47,7 +47,7 @@ HB_BEGIN_DECLS
 /*
  * Every request starts the client when it is not running, and fails as hb_init() does when that fails. Sending fails
  * with `HB_ECOMM` (no connection), `HB_EDAEMONGONE`, `HB_ENOMEM` or one of the other send errors of hb_client/error.h.
- * In VEX mode nothing is sent, which is no failure.
+ * In VEX mode nothing is sent, which is no failure; but an answer cannot be awaited there, which is `HB_ECOMM`.
  *
  * A request without an answer succeeds when it was sent. Those with an answer wait for it, 55 seconds at most unless it
  * is said otherwise, and then fail with `HB_ENOTREADY`; with `HB_EDAEMONGONE` or `HB_ECOMM` when it cannot be read, and

@@ -24,7 +24,8 @@ HB_BEGIN_DECLS
 
 /*
  * Each of these starts the client when it is not running, and fails as hb_init() does when that fails. A null pointer
- * is `HB_EINVAL`. Outputs are written on success alone.
+ * is `HB_EINVAL`. Outputs are written on success alone. In VEX mode nothing is sent and nothing is published: a message
+ * is then taken as sent, asking for a route is `HB_ECOMM`, and reading one is `HB_ENOROUTE`.
  */
 
 /**
