@@ -4,7 +4,6 @@
 
 #include <algorithm>
 #include <cstddef>
-#include <cstdlib>
 #include <cstring>
 #include <limits>
 #include <tuple>
@@ -89,7 +88,7 @@ bool has_equal_neighbours(const int* nodes, int count) {
 // Two nodes may stand in either order; more are put in order where the caller has them.
 Hb_Rc check_destinations(int* nodes, int num_nodes) {
   if (num_nodes > 2) {
-    qsort(nodes, static_cast<size_t>(num_nodes), sizeof *nodes, int_compare);
+    std::sort(nodes, nodes + num_nodes, [](int first, int second) { return int_compare(&first, &second) < 0; });
   }
   return has_equal_neighbours(nodes, num_nodes) ? fail(HB_EINVAL) : Hb_Success;
 }
