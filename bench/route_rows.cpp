@@ -89,17 +89,31 @@ void compare_reads(const Compare& compare, Read read) {
            .operations = batch});
 }
 
-// Writes from another processor where there is one, as a daemon does.
-void use_any_processor() {
-  cpu_set_t all;
-  std::memset(&all, 0xFF, sizeof all);
-  sched_setaffinity(0, sizeof all, &all);
-}
+// While it lives this thread may use any processor, and so may a thread for all its life that is started meanwhile.
+class Any_Processor {
+ public:
+  Any_Processor() {
+    sched_getaffinity(0, sizeof before_, &before_);
+    cpu_set_t all;
+    std::memset(&all, 0xFF, sizeof all);
+    sched_setaffinity(0, sizeof all, &all);
+  }
+  ~Any_Processor() { sched_setaffinity(0, sizeof before_, &before_); }
+  Any_Processor(const Any_Processor&) = delete;
+  Any_Processor& operator=(const Any_Processor&) = delete;
 
-// Rewrites the routes at its pace for as long as it lives.
+ private:
+  cpu_set_t before_{};
+};
+
+// Rewrites the routes at its pace for as long as it lives, from another processor where there is one, as a daemon does.
 class Rewriter {
  public:
-  explicit Rewriter(const BareRoutes& routes) : routes_(routes) {}
+  explicit Rewriter(const BareRoutes& routes) : routes_(routes) {
+    const Any_Processor any;
+    thread_ = std::jthread([this](const std::stop_token& stop) { rewrite_until(stop); });
+    rewritten_.wait(0);
+  }
 
   // Throws when it did not keep its pace.
   void check_pace() const {
@@ -112,11 +126,11 @@ class Rewriter {
 
  private:
   void rewrite_until(const std::stop_token& stop) {
-    use_any_processor();
     auto next = start_;
     while (!stop.stop_requested()) {
       routes_.rewrite();
       ++rewritten_;
+      rewritten_.notify_one();
       next += rewriting_interval;
       std::this_thread::sleep_until(next);
     }
@@ -125,7 +139,7 @@ class Rewriter {
   const BareRoutes& routes_;
   std::chrono::steady_clock::time_point start_ = std::chrono::steady_clock::now();
   std::atomic<int64_t> rewritten_ = 0;
-  std::jthread thread_{[this](const std::stop_token& stop) { rewrite_until(stop); }};
+  std::jthread thread_;
 };
 
 double timed(const std::function<void()>& operation) {
