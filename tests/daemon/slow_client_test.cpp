@@ -86,7 +86,7 @@ TEST(Client, is_turned_away_while_no_descriptor_is_free_and_the_others_are_serve
   ASSERT_TRUE(served->configuration());
   leave_one_descriptor(daemon);
   Connection last(directory.path("socket"));
-  ASSERT_TRUE(last.configuration());
+  ASSERT_TRUE(last.configuration()) << daemon.log();
 
   const Connection unwanted(directory.path("socket"));
   EXPECT_TRUE(unwanted.wait_until_ended());

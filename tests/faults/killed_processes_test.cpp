@@ -51,7 +51,7 @@ class Writer {
   }
 
  private:
-  static volatile uint32_t* attach(int id) { return static_cast<volatile uint32_t*>(shmat(id, nullptr, 0)); }
+  static uint32_t* attach(int id) { return static_cast<uint32_t*>(shmat(id, nullptr, 0)); }
 
   void operate(unsigned short semaphore, short change, short flags) const {
     sembuf operation = {semaphore, change, flags};
@@ -61,8 +61,7 @@ class Writer {
 
   // The number goes first and comes back last: what lies between is valid to nobody.
   void rewrite() {
-    configuration_[0] = 0;
-    std::atomic_thread_fence(std::memory_order_seq_cst);
+    set_number(0);
     const uint32_t number = ++number_ == 0 ? ++number_ : number_;
     for (uint32_t node = 0; node < nodes; ++node) {
       uint32_t words[44];
@@ -73,12 +72,13 @@ class Writer {
       route[1] = 36;
       for (size_t i = 0; i < 44; ++i) route[2 + i] = words[i];
     }
-    std::atomic_thread_fence(std::memory_order_seq_cst);
-    configuration_[0] = number;
+    set_number(number);
   }
 
+  void set_number(uint32_t number) const { std::atomic_ref(*configuration_).exchange(number); }
+
   int semaphores_;
-  volatile uint32_t* configuration_;
+  uint32_t* configuration_;
   volatile uint32_t* routes_;
   uint32_t number_ = 0;
   uint32_t seed_ = static_cast<uint32_t>(getpid());
