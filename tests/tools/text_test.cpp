@@ -37,7 +37,7 @@ TEST(HbctlText, writes_timestamps_in_utc_to_the_millisecond) {
 }
 
 TEST(HbctlText, writes_the_time_of_day_of_the_place) {
-  setenv("TZ", "XXX-2", 1);  // two hours east
+  setenv("TZ", "<+02>-2", 1);  // two hours east
   tzset();
   const WallClock::time_point time{seconds(1000000000) + milliseconds(120)};
   EXPECT_EQ(time_of_day(time), "03:46:40.120");
