@@ -21,6 +21,7 @@
 #include "hb_client/events.h"
 #include "hb_client/group.h"
 #include "hb_client/lifecycle.h"
+#include "hb_client/migration.h"
 #include "hb_client/route.h"
 #include "hb_client/security.h"
 #include "hb_client/subscription.h"

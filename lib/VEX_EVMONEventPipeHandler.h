@@ -6,8 +6,10 @@
 class EVMONEventPipeHandler : public EVMONHandler {
  public:
   EVMONEventPipeHandler(int32_t* fds, char* path);  // fds: read end, write end; both are taken over
+  explicit EVMONEventPipeHandler(char* path);       // a monitor file in the place of a pipe
   ~EVMONEventPipeHandler() override;
 
+  // Delivers one queued event.
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
   int32_t getWriteFd() { return evmon_pipe_write_fd; }
 

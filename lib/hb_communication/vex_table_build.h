@@ -1,14 +1,35 @@
-// VEX mode: building the configuration table from the cluster services. On this platform they are absent.
+// VEX mode: building the configuration table from the cluster services, and the lists of boot addresses.
 #pragma once
 
 #include "hb_global_data/state.h"
+#include "zu_evm.h"
 
-struct zu_evm_event_metadata_t;
-
+// Fills the table from the cluster services; `errno` stays. The notification that caused it, the table whose states are
+// carried over, and a list in place of the query may each be null.
 Hb_Rc hb_vex_update_global_tbl(Hb_Configuration_Internal* cfg_table, zu_evm_event_metadata_t* event_metadata_p,
                                Hb_Configuration_Internal* src_cfg_table, zu_vex_net_intf_info_t* p_src_intf_tbl);
 
+// Moves global_config_tbl_new into global_config_tbl.
+void VEX_copy_and_delete_global_config_tbl();
+
+void empty_global_config_table(Hb_Configuration_Internal* table);
+
+void hb_vex_dump_global_table(Hb_Configuration_Internal* table, const char* name);
+
 Hb_Rc hb_vex_get_net_intf_info_and_mark_alias(zu_vex_net_intf_info_t** p_list, zu_vex_net_intf_info_t* p_boot_list);
 
+Hb_Rc hb_get_new_net_intf_info(zu_vex_net_intf_info_t** p_list);
+
+void hb_refresh_boot_ip_addrs(zu_vex_net_intf_info_t** p_list);
+
+// Whether the list has the interface. Node -1 is any node; a name alone is enough, and so is an address alone.
+Hb_Boolean hb_check_if_in_netf_list_by_ipaddr_or_intf(zu_vex_net_intf_info_t* p_list, int node_number,
+                                                      const char* p_name, zu_vex_IP_address6_t* p_address);
+Hb_Boolean hb_check_if_in_global_boot_ip_list(int node_number, const char* p_name, zu_vex_IP_address6_t* p_address);
+
+// Copies, in reverse order, the entries that have one of the flags, or those that have none of them. Flags 0 is all.
 Hb_Rc hb_copy_net_intf_filter_by_flag(zu_vex_net_intf_info_t** p_dest, zu_vex_net_intf_info_t* p_src, uint64_t flags,
                                       Hb_Boolean negate);
+
+// 1 when they are the same, else 0; an IPv4-mapped address is never the same as a native one.
+int same_ip_address(const zu_vex_IP_address6_t* first, const zu_vex_IP_address6_t* second);

@@ -1,16 +1,36 @@
-// The queue of synthesized events.
+// The queue of synthesized events, their numbering, and the byte that wakes a caller.
 #pragma once
 
 #include "hb_client/events.h"
 #include "hb_global_data/state.h"
 
+// Large, and so never copied: the queue owns it from the moment that it is appended until it is taken.
 struct VEX_Event {
-  int32_t sequence_num;
+  int32_t sequence_num;  // in the queue's numbering
   Hb_Group group;
   VEX_Event* next;
-  uint32_t type;
-  uint16_t node_num;
-  Hb_Site_Number site_num;
+  uint32_t type;            // a VEX_Event_Type
+  uint16_t node_num;        // the node that VEX_Daemon_Up is about
+  Hb_Site_Number site_num;  // the site that it is about
+};
+
+enum VEX_Event_Type : uint32_t {
+  VEX_Deliver = 0,    // as it is
+  VEX_Daemon_Up = 1,  // only when the node is down because its group-services daemon was
 };
 
 Hb_Boolean VEX_event_queue_is_empty();
+
+// Numbers the event and appends it. The pipe is written by whoever has appended all events of one notification.
+void VEX_add_event_at_end(Hb_VEX_Event* _event);
+
+// The first event, which is the caller's then; null when there is none. Its `next` is stale.
+Hb_VEX_Event* VEX_get_event_from_head();
+
+// Traces what is in the queue.
+void VEX_display_event_list();
+
+// Writes one byte when an event waits, and otherwise starts the numbering anew.
+Hb_Rc VEX_write_to_event_pipe();
+
+zu_int32_t hb_vex_next_event_sequence();

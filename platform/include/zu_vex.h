@@ -75,13 +75,75 @@ typedef struct zu_vex_cluster_info_t {
   uint32_t cluster_type;
 } zu_vex_cluster_info_t;
 
+typedef zu_vex_uuid_t zu_vex_node_id_t;
+typedef zu_vex_uuid_t zu_vex_site_id_t;
+typedef uint32_t zu_vex_site_num_t;
+typedef uint32_t zu_vex_cfg_chg_op_t;
+
+typedef enum zu_vex_node_status_t ZU_VEX_ENUM_BASE {
+  ZU_VEX_NODE_STATUS_UNDEF = -1,
+  ZU_VEX_NODE_STATUS_DOWN = 0,
+  ZU_VEX_NODE_STATUS_UP = 1,
+} zu_vex_node_status_t;
+
+typedef enum zu_vex_node_down_reason_t ZU_VEX_ENUM_BASE {
+  ZU_VEX_NODE_DOWN_REASON_NONE = 0,
+  ZU_VEX_NODE_DOWN_REASON_LINK_DOWN = 1,
+  ZU_VEX_NODE_DOWN_REASON_SHUTDOWN = 2,
+  ZU_VEX_NODE_DOWN_REASON_STOPPED = 3,
+  ZU_VEX_NODE_DOWN_REASON_FORCE_DOWN = 4,
+} zu_vex_node_down_reason_t;
+
+/** One node of the cluster; a linked list. */
+typedef struct zu_vex_node_info_t {
+  zu_vex_node_num_t number;
+  zu_vex_node_id_t id;
+  char* p_name;
+  zu_vex_node_status_t status;
+  zu_vex_site_id_t site_id;
+  zu_vex_site_num_t site_number;
+  zu_vex_cfg_chg_op_t cfg_op;
+  struct zu_vex_node_info_t* p_next;
+  zu_vex_node_down_reason_t node_down_reason;
+} zu_vex_node_info_t;
+
+typedef uint32_t zu_vex_site_policy_t;
+
+/** A site. */
+typedef struct zu_vex_site_info_t {
+  zu_vex_site_id_t id;
+  zu_vex_site_num_t number;
+  uint32_t priority;
+} zu_vex_site_info_t;
+
+struct zu_evm_event_metadata_t;
+
 /*
  * Each query returns 0 and hands out what it found, or another value and leaves the output alone. A platform without
- * cluster services yields -1.
+ * cluster services yields -1. An empty list is null. What is handed out belongs to the caller, who gives it back with
+ * the function of its kind below; whoever keeps a list may change its records, and may put other ones in.
  */
 int zu_vex_get_cluster_info(zu_vex_cluster_info_t** info);
+
+/** All nodes of the cluster, this one included. */
+int zu_vex_get_node_info(zu_vex_node_info_t** list);
+
+/** The same, as it is once what the notification tells of has happened. */
+int zu_vex_get_node_info_after_event(const struct zu_evm_event_metadata_t* event, zu_vex_node_info_t** list);
+
+/** The interface addresses of all nodes. */
 int zu_vex_get_net_intf_info(zu_vex_net_intf_info_t** list);
+
+/** The same, as it is once what the notification tells of has happened. */
+int zu_vex_get_net_intf_info_after_event(const struct zu_evm_event_metadata_t* event, zu_vex_net_intf_info_t** list);
+
+/** The addresses that the nodes start with. */
 int zu_vex_get_boot_addrs(zu_vex_net_intf_info_t** list);
+
+/* Each releases a record or a whole list with everything in it; null is nothing. */
+void zu_vex_free_cluster_info(zu_vex_cluster_info_t* info);
+void zu_vex_free_node_info(zu_vex_node_info_t* list);
+void zu_vex_free_net_intf_info(zu_vex_net_intf_info_t* list);
 
 #ifdef __cplusplus
 }

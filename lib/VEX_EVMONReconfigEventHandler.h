@@ -1,0 +1,11 @@
+// The monitor of cluster reconfiguration.
+#pragma once
+
+#include "VEX_EVMONConfigurationHandler.h"
+
+class EVMONReconfigEventHandler : public EVMONConfigurationHandler {
+ public:
+  explicit EVMONReconfigEventHandler(char* path);
+
+  Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
+};

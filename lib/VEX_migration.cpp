@@ -1,0 +1,1 @@
+#include "VEX_migration.h"

@@ -1,0 +1,1 @@
+#include "hb_communication/vex_table_build.h"
