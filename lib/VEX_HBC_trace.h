@@ -3,6 +3,8 @@
 
 #include <cerrno>
 #include <cstdint>
+#include <cstring>
+#include <utility>
 
 #include "trace_records.h"
 #include "zu_tr.h"
@@ -56,6 +58,44 @@ struct Trace_Block {
   const void* bytes;
   uint32_t length;
 };
+
+// The trace library takes a pointer and a length for each block.
+template <size_t Part>
+auto part_of(const Trace_Block* blocks) {
+  if constexpr (Part % 2 == 0) {
+    return blocks[Part / 2].bytes;
+  } else {
+    return blocks[Part / 2].length;
+  }
+}
+
+template <size_t... Parts>
+void record_blocks(Trace_Category category, Trace_Record record, const Trace_Block* blocks,
+                   std::index_sequence<Parts...>) {
+  const Errno_Kept kept;
+  tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], static_cast<uint32_t>(sizeof...(Parts) / 2),
+                      part_of<Parts>(blocks)...);
+}
+
+// A record of any number of blocks, as in trace_data(category, record, {{a, 4}, {b, 8}}).
+template <size_t Count>
+void trace_data(Trace_Category category, Trace_Record record, const Trace_Block (&blocks)[Count]) {
+  if (trace_is_on(category)) {
+    record_blocks(category, record, blocks, std::make_index_sequence<2 * Count>());
+  }
+}
+
+// The block of a value.
+template <typename Value>
+Trace_Block block_of(const Value& value) {
+  return {&value, static_cast<uint32_t>(sizeof value)};
+}
+
+// The block of a text with its terminator; a missing text is empty.
+inline Trace_Block block_of_text(const char* text) {
+  const char* shown = text != nullptr ? text : "";
+  return {shown, static_cast<uint32_t>(std::strlen(shown) + 1)};
+}
 
 inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a, Trace_Block b) {
   if (trace_is_on(category)) {
