@@ -185,6 +185,12 @@ constexpr auto hbc_entries = std::to_array<Catalogue_Entry>({
     {320, "subscription: there is no new group handler"},
     {321, "subscription: new group pipe could not be written: result {}, errno {}"},
     {322, "subscription: new group pipe written: descriptor {}"},
+    {330, "node list: event type {}, node {}, sequence number {number}, reason {}, name {text}"},
+    {331, "peer group services: event type {}, process {}, sequence number {number}, reason {}, name {text}"},
+    {332, "cluster reconfiguration: event type {}, node {}, sequence number {number}, reason {}"},
+    {333, "repository disk: event type {}, node {}, sequence number {number}, reason {}, name {text}"},
+    {334, "site configuration: event type {}, node {}, site {}, sequence number {number}, reason {}, name {text}"},
+    {335, "IP change: event type {}, node {}, interface {text}, address {text}"},
 });
 
 constexpr bool ascends(const Catalogue_Entry& first, const Catalogue_Entry& second) { return first.id < second.id; }
