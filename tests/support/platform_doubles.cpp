@@ -81,18 +81,10 @@ uint32_t Recorded_Trace::block_value(size_t index) const {
   return value;
 }
 
-template <typename Output>
-int Vex_Query<Output>::ask(Output** output) {
-  ++calls;
-  if (answers.empty()) return -1;
-  const Vex_Answer<Output> answer = answers.front();
-  answers.pop_front();
-  if (answer.result == 0) *output = answer.output;
-  if (answer.error != 0) errno = answer.error;
-  return answer.result;
+void Platform_Double::reset() {
+  *this = Platform_Double();
+  scripted_cluster().reset();
 }
-
-void Platform_Double::reset() { *this = Platform_Double(); }
 
 void Platform_Double::set_levels(const std::vector<uint8_t>& new_levels) {
   levels = new_levels;
@@ -192,12 +184,6 @@ void __zu_assert(const char* text, const char* file, int line) {
   std::fprintf(stderr, "assertion failed: %s, file %s, line %d\n", text, file, line);
   std::abort();
 }
-
-int zu_vex_get_cluster_info(zu_vex_cluster_info_t** info) { return platform_double().cluster_info.ask(info); }
-
-int zu_vex_get_net_intf_info(zu_vex_net_intf_info_t** list) { return platform_double().net_intf_info.ask(list); }
-
-int zu_vex_get_boot_addrs(zu_vex_net_intf_info_t** list) { return platform_double().boot_addrs.ask(list); }
 
 int sec_unmarshal_typed_key(const sec_buffer* buffer, sec_key_desc* key) {
   Platform_Double& platform = platform_double();

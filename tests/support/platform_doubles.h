@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "scripted_cluster.h"
 #include "zu_cu.h"
 #include "zu_mss.h"
 #include "zu_tr.h"
@@ -61,16 +62,16 @@ template <typename Output>
 struct Vex_Answer {
   int result;
   Output* output;
-  int error = 0;  // left in `errno` when not 0
+  int error = 0;          // left in `errno` when not 0
+  bool as_usual = false;  // what the query yields without a script
 };
 
-// A query of the cluster services: answers are used up in order; without one the services are absent (-1).
+// A query of the cluster services: answers are used up in order; without one the scripted cluster answers, whose
+// services are absent (-1) unless a test has them appear.
 template <typename Output>
 struct Vex_Query {
   std::deque<Vex_Answer<Output>> answers;
   int calls = 0;
-
-  int ask(Output** output);
 };
 
 // Answer to one sec_unmarshal_typed_key(): the key is filled only with result 0, otherwise it is zeroed.
@@ -108,7 +109,10 @@ struct Platform_Double {
 
   // Cluster services.
   Vex_Query<zu_vex_cluster_info_t> cluster_info;
+  Vex_Query<zu_vex_node_info_t> node_info;
+  Vex_Query<zu_vex_node_info_t> node_info_after_event;
   Vex_Query<zu_vex_net_intf_info_t> net_intf_info;
+  Vex_Query<zu_vex_net_intf_info_t> net_intf_info_after_event;
   Vex_Query<zu_vex_net_intf_info_t> boot_addrs;
 
   // Keys. Without an answer left a key is refused (-1).
@@ -116,7 +120,8 @@ struct Platform_Double {
   std::vector<Recorded_Unmarshal> unmarshals;
   std::vector<Recorded_Release> releases;
 
-  // Back to the state of a fresh process, except that levels and tokens handed out stay with the component.
+  // Back to the state of a fresh process, except that levels and tokens handed out stay with the component. The
+  // scripted cluster is reset, too.
   void reset();
 
   // Changes the levels of later registrations and of every component that has registered.
