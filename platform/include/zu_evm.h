@@ -212,6 +212,68 @@ typedef struct zu_evm_event_metadata_t {
   } event;
 } zu_evm_event_metadata_t;
 
+/* Where what the platform hands out has its fields. */
+#define ZU_EVM_SIZE(type, size) static_assert(sizeof(type) == (size), #type)
+#define ZU_EVM_FIELD(type, field, offset) static_assert(offsetof(type, field) == (offset), #type "." #field)
+
+ZU_EVM_SIZE(zu_evm_event_node_liveness_t, 32);
+ZU_EVM_FIELD(zu_evm_event_node_liveness_t, event_type, 0);
+ZU_EVM_FIELD(zu_evm_event_node_liveness_t, node_number, 4);
+ZU_EVM_FIELD(zu_evm_event_node_liveness_t, node_id, 8);
+ZU_EVM_FIELD(zu_evm_event_node_liveness_t, sequence_number, 16);
+ZU_EVM_FIELD(zu_evm_event_node_liveness_t, reason_number, 24);
+ZU_EVM_FIELD(zu_evm_event_node_liveness_t, node_down_reason, 28);
+
+ZU_EVM_SIZE(zu_evm_event_split_merge_cfg_t, 96);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, event_type, 0);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, event_subtype, 4);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, node_number, 8);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, node_id, 16);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, site_id, 32);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, site_priority, 48);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, site_number, 52);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, sequence_number, 56);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, reason_number, 64);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, num_local_node_up, 68);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, num_remote_node_up, 72);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, local_node_numbers, 80);
+ZU_EVM_FIELD(zu_evm_event_split_merge_cfg_t, remote_node_numbers, 88);
+
+ZU_EVM_SIZE(zu_evm_event_adapter_liveness_t, 40);
+ZU_EVM_FIELD(zu_evm_event_adapter_liveness_t, event_type, 0);
+ZU_EVM_FIELD(zu_evm_event_adapter_liveness_t, node_number, 4);
+ZU_EVM_FIELD(zu_evm_event_adapter_liveness_t, node_id, 8);
+ZU_EVM_FIELD(zu_evm_event_adapter_liveness_t, sequence_number, 16);
+ZU_EVM_FIELD(zu_evm_event_adapter_liveness_t, reason_number, 24);
+ZU_EVM_FIELD(zu_evm_event_adapter_liveness_t, p_interface_name, 32);
+
+ZU_EVM_SIZE(zu_evm_event_ip_change_t, 56);
+ZU_EVM_FIELD(zu_evm_event_ip_change_t, event_type, 0);
+ZU_EVM_FIELD(zu_evm_event_ip_change_t, node_number, 4);
+ZU_EVM_FIELD(zu_evm_event_ip_change_t, node_id, 8);
+ZU_EVM_FIELD(zu_evm_event_ip_change_t, sequence_number, 16);
+ZU_EVM_FIELD(zu_evm_event_ip_change_t, reason_number, 24);
+ZU_EVM_FIELD(zu_evm_event_ip_change_t, p_interface_name, 32);
+ZU_EVM_FIELD(zu_evm_event_ip_change_t, ip_addr, 40);
+
+ZU_EVM_SIZE(zu_evm_event_addr_cfg_t, 64);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, event_type, 0);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, node_number, 4);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, node_id, 8);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, sequence_number, 16);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, reason_number, 24);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, intf_name, 32);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, ipaddr, 40);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, netmask, 48);
+ZU_EVM_FIELD(zu_evm_event_addr_cfg_t, next, 56);
+
+ZU_EVM_SIZE(zu_evm_event_metadata_t, 16);
+ZU_EVM_FIELD(zu_evm_event_metadata_t, category, 0);
+ZU_EVM_FIELD(zu_evm_event_metadata_t, event, 8);
+
+#undef ZU_EVM_SIZE
+#undef ZU_EVM_FIELD
+
 enum {
   ZU_EVM_RECORD = 0,               /**< a record was read; the node-liveness monitor has the two below instead */
   ZU_EVM_SPLIT_MERGE_RECORD = 1,   /**< the node-liveness monitor delivered a split or a merge */

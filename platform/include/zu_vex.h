@@ -2,7 +2,9 @@
 #ifndef ZU_VEX_H
 #define ZU_VEX_H
 
+#include <assert.h>
 #include <netinet/in.h>
+#include <stddef.h>
 #include <stdint.h>
 
 #ifdef __cplusplus
@@ -59,11 +61,15 @@ typedef struct zu_vex_net_intf_info {
   void* caller_data;
   struct zu_vex_net_intf_info* p_next;
 } zu_vex_net_intf_info_t;
+static_assert(sizeof(zu_vex_net_intf_info_t) == 96, "zu_vex_net_intf_info_t");
+static_assert(sizeof(zu_vex_IP_address6_t) == 16, "zu_vex_IP_address6_t");
+static_assert(sizeof(zu_vex_hwaddr_t) == 6, "zu_vex_hwaddr_t");
 
 typedef struct zu_vex_uuid_t {
   uint64_t high;
   uint64_t low;
 } zu_vex_uuid_t;
+static_assert(sizeof(zu_vex_uuid_t) == 16, "zu_vex_uuid_t");
 
 /** The cluster. */
 typedef struct zu_vex_cluster_info_t {

@@ -44,9 +44,15 @@ TEST(Exports, OfTheSecurityLibrary) {
   EXPECT_THAT(exports_of(ZU_MSS_LIBRARY), ElementsAre("sec_release_typed_key", "sec_unmarshal_typed_key"));
 }
 
-TEST(Exports, OfTheClusterServices) {
+TEST(Exports, OfTheClusterServicesAndMonitors) {
   EXPECT_THAT(exports_of(ZU_VEX_LIBRARY),
-              ElementsAre("zu_vex_get_boot_addrs", "zu_vex_get_cluster_info", "zu_vex_get_net_intf_info"));
+              ElementsAre("zu_evm_free", "zu_evm_open", "zu_evm_read_adapter_liveness", "zu_evm_read_cluster_reconfig",
+                          "zu_evm_read_ip_change", "zu_evm_read_node_list", "zu_evm_read_node_liveness",
+                          "zu_evm_read_process_liveness", "zu_evm_read_repository_disk", "zu_evm_read_site_cfg",
+                          "zu_evm_read_split_merge", "zu_vex_free_cluster_info", "zu_vex_free_net_intf_info",
+                          "zu_vex_free_node_info", "zu_vex_get_boot_addrs", "zu_vex_get_cluster_info",
+                          "zu_vex_get_net_intf_info", "zu_vex_get_net_intf_info_after_event", "zu_vex_get_node_info",
+                          "zu_vex_get_node_info_after_event"));
 }
 
 }  // namespace
