@@ -53,6 +53,13 @@ void trace_values(Trace_Category category, Trace_Record record, Values... values
   }
 }
 
+inline void trace_text(Trace_Category category, Trace_Record record, const char* text) {
+  if (trace_is_on(category)) {
+    const Errno_Kept kept;
+    tr_ms_record_strings_1(hbc_trace_component, record, pTokens[category], 1, text);
+  }
+}
+
 // One data block of a record.
 struct Trace_Block {
   const void* bytes;
@@ -95,6 +102,13 @@ Trace_Block block_of(const Value& value) {
 inline Trace_Block block_of_text(const char* text) {
   const char* shown = text != nullptr ? text : "";
   return {shown, static_cast<uint32_t>(std::strlen(shown) + 1)};
+}
+
+inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a) {
+  if (trace_is_on(category)) {
+    const Errno_Kept kept;
+    tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], 1, a.bytes, a.length);
+  }
 }
 
 inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a, Trace_Block b) {

@@ -5,99 +5,172 @@
 #include <cstdint>
 
 enum Trace_Record : uint32_t {
+  trace_monitor_without_path = 7,  // no values
+  trace_monitor_not_opened = 8,    // data: path, result of the open, errno
   trace_node_liveness = 10,  // data: event type, node, node id (8 bytes), sequence number (8 bytes), reason number
-  trace_node_liveness_read_failed = 11,     // result of the read, errno, descriptor
-  trace_peer_gs_read_failed = 13,           // data: result of the read, descriptor, errno
-  trace_adapter_liveness = 14,              // data: interface name
-  trace_adapter_liveness_read_failed = 15,  // result of the read, descriptor, errno
+  trace_node_liveness_read_failed = 11,       // result of the read, errno, descriptor
+  trace_peer_gs_read_failed = 13,             // data: result of the read, descriptor, errno
+  trace_adapter_liveness = 14,                // data: interface name
+  trace_adapter_liveness_read_failed = 15,    // result of the read, descriptor, errno
+  trace_new_group_read_failed = 28,           // result of the read, errno
+  trace_new_group_without_cluster_name = 29,  // no values
+  trace_new_group_nodes_failed = 32,          // result of the query, error number
+  trace_new_group_adapters_failed = 33,       // result of the query, errno, error number
+  trace_new_group_unknown = 35,               // byte, result of the read, error number
+  trace_table_query_failed = 36,              // data: name of the call, "(Default)", its result, errno
+  trace_adapter_compared_with_table = 44,     // no values
+  trace_adapter_is_alias = 45,                // data: interface name
+  trace_monitor_not_registered = 47,          // data: path, descriptor
+  trace_handler_not_registered = 48,          // descriptor
+  trace_adapter_in_table = 49,                // no values
+  trace_reconfig_read_failed = 52,            // data: result of the read, descriptor, errno
+  trace_event_pipe = 55,                      // read descriptor, write descriptor
+  trace_event_list_ends = 57,                 // text
+  trace_event_pipe_write_failed = 58,         // result of the write, errno
+  trace_event_pipe_written = 59,              // no values
+  trace_event_pipe_message = 60,              // byte, result of the read, error number
+  trace_node_group_not_copied = 66,           // no values
+  trace_adapter_group_not_copied = 67,        // no values
+  trace_join_without_cluster_name = 68,       // no values
+  trace_join_adapters_failed = 69,            // result of the query, errno, error number
+  trace_event_in_list = 71,                   // sequence number, group type, events
+  trace_counterpart_adapter = 74,             // data: adapter type, node number
+  trace_adapter_without_counterpart = 75,     // data: adapter type, adapter number, state, node number
+  trace_adapter_counterpart_not_up = 76,      // data: adapter type, adapter number, state, node number
+  trace_adapter_event_extended = 77,          // event kind, adapters so far
+  trace_adapters_of_dead_node = 78,           // no values
+  trace_adapter_goes_down = 79,               // data: adapter type, adapter number, state, node number
+  trace_new_adapter_event = 80,               // events, adapter number
+  trace_adapter_in_event = 81,                // events, adapter number
+  trace_adapters_on_node = 84,                // event kind, number of adapters
+  trace_node_information_without_group = 85,  // no values
+  trace_no_node_death_event = 86,             // no values
+  trace_monitor_opened = 90,                  // data: path, descriptor
+  trace_message_received_from = 92,           // node number
+  trace_ip_change_read_failed = 95,           // result of the read, descriptor, errno
+  trace_adapter_not_in_table = 96,            // no values
+  trace_node_missing_from_table = 97,         // node
+  trace_migration_handlers_failed = 98,       // result, error number
+  trace_migration_table_failed = 99,          // result
+  trace_migration_local_node_differs = 100,   // local node in the current table, in the trial table
+  trace_migration_node_missing = 101,         // result
+  trace_local_node_differs = 102,             // local node number of the first table, of the second
+  trace_node_missing_in_table = 103,          // result
+  trace_counts_differ = 104,                  // nodes of both tables, adapters of both, networks of both
+  trace_adapter_looked_for = 105,             // no values
+  trace_adapter_candidate = 106,              // no values
+  trace_adapter_found = 107,                  // no values
+  trace_adapter_differs = 108,                // no values
+  trace_delayed_shutdown = 109,               // no values
 
-  trace_table_query_failed = 36,  // data: name of the call, "(Default)", its result, errno
+  trace_socket_removed = 110,    // no values
+  trace_selector_removed = 111,  // no values
 
-  trace_adapter_compared_with_table = 44,  // no values
-  trace_adapter_is_alias = 45,             // data: interface name
-  trace_adapter_in_table = 49,             // no values
+  trace_no_adapter_event_pointer = 112,           // no values
+  trace_adapter_information_without_group = 113,  // no values
+  trace_node_list_read_failed = 116,              // data: result of the read, descriptor, errno
+  trace_adapter_loaded = 118,                     // adapter number, node number
+  trace_adapter_address_repeated = 119,           // data: address text, adapter type, adapter number, state
+  trace_table = 121,                              // data: name of the table
+  trace_table_node = 122,                         // node number, state, reason
+  trace_table_adapter = 123,                      // data: adapter type, address text, adapter number, state
+  trace_comparing_gone_adapters = 124,            // no values
+  trace_comparing_gone_nodes = 125,               // no values
+  trace_comparing_new_adapters = 126,             // no values
+  trace_comparing_new_nodes = 127,                // no values
+  trace_update_adapter_deaths = 128,              // no values
+  trace_update_node_deaths = 129,                 // no values
+  trace_update_takes_effect = 130,                // no values
+  trace_delivering_configuration = 131,           // no values
+  trace_table_copied = 132,                       // number of nodes
+  trace_table_numbers = 134,          // nodes, most nodes, local node, adapters, adapters per node, networks
+  trace_adapters_accepted = 146,      // number of adapters
+  trace_adapter_under_number = 147,   // data: address text, adapter number
+  trace_adapter_under_address = 148,  // data: address text, adapter number
 
-  trace_reconfig_read_failed = 52,  // data: result of the read, descriptor, errno
+  trace_queued_event = 154,                      // no values: an event is waiting in the queue
+  trace_event_pipe_queue_empty = 166,            // no values
+  trace_node_death_is_stale = 168,               // data: as trace_node_liveness
+  trace_none_registered = 169,                   // error number, registered handlers
+  trace_dispatch_without_handler = 170,          // first descriptor of the list
+  trace_daemon_up = 171,                         // node number
+  trace_daemon_up_dropped = 172,                 // node number, its state
+  trace_daemon_up_node_unknown = 173,            // node number
+  trace_node_return_is_stale = 174,              // data: as trace_node_liveness
+  trace_event_pipe_poll_failed = 176,            // result of the poll, errno
+  trace_event_pipe_read_failed = 177,            // result of the read, errno
+  trace_event_pipe_at_end = 178,                 // no values
+  trace_event_pipe_polled = 179,                 // events of the poll
+  trace_event_pipe_not_ready = 180,              // no values
+  trace_adapter_went_down = 181,                 // no values
+  trace_adapter_came_up = 182,                   // no values
+  trace_adapter_repeated = 183,                  // no values
+  trace_adapter_information_unsubscribed = 185,  // no values
+  trace_node_information_unsubscribed = 186,     // no values
+  trace_update_without_name = 187,               // no values
+  trace_adapter_event_unsubscribed = 188,        // no values
+  trace_node_event_unsubscribed = 189,           // no values
+  trace_new_node_group_unsubscribed = 190,       // no values
+  trace_new_adapter_group_unsubscribed = 191,    // no values
+  trace_dead_node_adapters_unsubscribed = 192,   // no values
+  trace_repository_disk_read_failed = 198,       // data: result of the read, descriptor, errno
+  trace_site_config_read_failed = 210,           // data: result of the read, descriptor, errno
+  trace_site_event_unsubscribed = 213,           // no values
+  trace_site_group_not_copied = 214,             // no values
+  trace_site_config_begins = 219,                // descriptor
+  trace_site_config_ends = 220,                  // descriptor
+  trace_adapter_liveness_begins = 221,           // descriptor
+  trace_adapter_liveness_ends = 222,             // descriptor
+  trace_event_pipe_begins = 223,                 // descriptor
+  trace_event_pipe_ends = 224,                   // descriptor
+  trace_ip_change_begins = 225,                  // descriptor
+  trace_ip_change_ends = 226,                    // descriptor
+  trace_new_group_begins = 227,                  // descriptor
+  trace_new_group_ends = 228,                    // no values
+  trace_node_list_begins = 229,                  // descriptor
+  trace_node_list_ends = 230,                    // descriptor
+  trace_node_liveness_begins = 231,              // descriptor
+  trace_update_begins = 233,                     // descriptor
+  trace_node_liveness_nothing = 236,             // no values
+  trace_adapter_liveness_nothing = 238,          // no values
+  trace_ip_change_nothing = 240,                 // no values
+  trace_site_config_nothing = 243,               // no values
+  trace_no_event_pipe = 245,                     // no values
+  trace_no_adapter_handler = 246,                // no values
+  trace_node_without_counterpart = 247,          // node number, state, event kind
+  trace_node_counterpart_not_up = 248,           // node number, state, event kind
+  trace_node_event_extended = 249,               // event kind, node number, nodes so far
+  trace_event_wait_begins = 250,                 // no values
+  trace_event_wait_ends = 251,                   // no values
+  trace_dispatch_begins = 252,                   // no values
+  trace_dispatch_ends = 253,                     // no values
+  trace_split_merge_begins = 254,                // descriptor
+  trace_split_merge_ends = 255,                  // descriptor
+  trace_split_merge = 256,                       // data: the numbers of the record, descriptor
+  trace_split_merge_nothing = 257,               // no values
+  trace_split_merge_read_failed = 258,           // result of the read, descriptor, errno
+  trace_split_merge_unsubscribed = 259,          // no values
+  trace_split_merge_no_memory = 262,             // data: errno, file (100 bytes), line
+  trace_split_marks_nodes = 263,                 // no values
+  trace_split_node_not_up = 264,                 // node, its state
+  trace_split_node_unknown = 265,                // node
+  trace_node_repeated = 267,                     // event type, node, state in the table, reason in the table
+  trace_boot_list_step_failed = 271,             // data: operation, what failed, its result, errno
 
-  trace_adapters_of_dead_node = 78,  // no values
-
-  trace_no_node_death_event = 86,  // no values
-
-  trace_ip_change_read_failed = 95,      // result of the read, descriptor, errno
-  trace_adapter_not_in_table = 96,       // no values
-  trace_node_missing_from_table = 97,    // node
-  trace_migration_handlers_failed = 98,  // result, error number
-  trace_migration_table_failed = 99,     // result
-
-  trace_migration_local_node_differs = 100,  // local node in the current table, in the trial table
-  trace_migration_node_missing = 101,        // result
-
-  trace_socket_removed = 110,            // no values
-  trace_selector_removed = 111,          // no values
-  trace_node_list_read_failed = 116,     // data: result of the read, descriptor, errno
-  trace_adapter_loaded = 118,            // adapter number, node number
-  trace_adapter_address_repeated = 119,  // data: address text, adapter type, adapter number, state
-
-  trace_queued_event = 154,  // no values: an event is waiting in the queue
-
-  trace_node_death_is_stale = 168,  // data: as trace_node_liveness
-
-  trace_dispatch_without_handler = 170,  // first descriptor of the list
-  trace_node_return_is_stale = 174,      // data: as trace_node_liveness
-
-  trace_adapter_went_down = 181,  // no values
-  trace_adapter_came_up = 182,    // no values
-  trace_adapter_repeated = 183,   // no values
-
-  trace_dead_node_adapters_unsubscribed = 192,  // no values
-  trace_repository_disk_read_failed = 198,      // data: result of the read, descriptor, errno
-
-  trace_site_config_read_failed = 210,  // data: result of the read, descriptor, errno
-  trace_site_config_begins = 219,       // descriptor
-
-  trace_site_config_ends = 220,         // descriptor
-  trace_adapter_liveness_begins = 221,  // descriptor
-  trace_adapter_liveness_ends = 222,    // descriptor
-  trace_ip_change_begins = 225,         // descriptor
-  trace_ip_change_ends = 226,           // descriptor
-  trace_node_list_begins = 229,         // descriptor
-
-  trace_node_list_ends = 230,            // descriptor
-  trace_node_liveness_begins = 231,      // descriptor
-  trace_node_liveness_nothing = 236,     // no values
-  trace_adapter_liveness_nothing = 238,  // no values
-
-  trace_ip_change_nothing = 240,    // no values
-  trace_site_config_nothing = 243,  // no values
-  trace_no_event_pipe = 245,        // no values
-  trace_no_adapter_handler = 246,   // no values
-
-  trace_event_wait_begins = 250,   // no values
-  trace_event_wait_ends = 251,     // no values
-  trace_dispatch_begins = 252,     // no values
-  trace_dispatch_ends = 253,       // no values
-  trace_split_merge_begins = 254,  // descriptor
-  trace_split_merge_ends = 255,    // descriptor
-  trace_split_merge = 256,         // data: event type, subtype, node, nodes up here, nodes up there, sequence number (8
-                                   // bytes), reason number, descriptor
-  trace_split_merge_nothing = 257,       // no values
-  trace_split_merge_read_failed = 258,   // result of the read, descriptor, errno
-  trace_split_merge_unsubscribed = 259,  // no values
-
-  trace_split_merge_no_memory = 262,  // data: errno, file (100 bytes), line
-  trace_split_marks_nodes = 263,      // no values
-  trace_split_node_not_up = 264,      // node, its state
-  trace_split_node_unknown = 265,     // node
-  trace_node_repeated = 267,          // event type, node, state in the table, reason in the table
-
-  trace_vex_start = 272,               // no values
-  trace_boot_addresses_failed = 273,   // result of the boot-address query
-  trace_mark_alias_failed = 274,       // result
-  trace_filter_failed = 275,           // result
-  trace_start_failed = 276,            // no values
-  trace_interface_query_failed = 277,  // result of the interface query
-
-  trace_node_liveness_ends = 284,  // descriptor, result
+  trace_vex_start = 272,                  // no values
+  trace_boot_addresses_failed = 273,      // result of the boot-address query
+  trace_mark_alias_failed = 274,          // result
+  trace_filter_failed = 275,              // result
+  trace_start_failed = 276,               // no values
+  trace_interface_query_failed = 277,     // result of the interface query
+  trace_cluster_query_failed = 278,       // result of the cluster query
+  trace_alias_address = 279,              // data: address text
+  trace_refresh_and_update_begins = 280,  // no values
+  trace_refresh_and_update_ends = 281,    // no values
+  trace_refresh_begins = 282,             // no values
+  trace_refresh_ends = 283,               // no values
+  trace_node_liveness_ends = 284,         // descriptor, result
+  trace_update_ends = 285,                // descriptor, result
 
   trace_node_of_adapter = 301,     // adapter number, node number
   trace_address_of_adapter = 302,  // data: address text, adapter number
@@ -113,8 +186,7 @@ enum Trace_Record : uint32_t {
   trace_no_new_group_handler = 320,    // no values
   trace_new_group_write_failed = 321,  // result of the write, errno
   trace_new_group_written = 322,       // descriptor
-
-  trace_node_list = 330,        // data: event type, node, sequence number (8 bytes), reason number, node name
+  trace_node_list = 330,               // data: event type, node, sequence number (8 bytes), reason number, node name
   trace_peer_gs = 331,          // data: event type, process id, sequence number (8 bytes), reason number, process name
   trace_reconfig = 332,         // data: event type, node, sequence number (8 bytes), reason number
   trace_repository_disk = 333,  // data: event type, node, sequence number (8 bytes), reason number, disk name

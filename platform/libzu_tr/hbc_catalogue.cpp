@@ -85,6 +85,8 @@ constexpr auto hbc_entries = std::to_array<Catalogue_Entry>({
     {132, "copying the new table: {} nodes"},
     {134, "  nodes {}, most nodes {}, local node {}, adapters {}, adapters per node {}, networks {}"},
     {146, "configuration table: {} adapters accepted"},
+    {147, "address {text} is found by the number of adapter {}"},
+    {148, "address {text} is found as that of adapter {}"},
     {154, "an event is waiting in the queue"},
     {166, "event pipe: the queue is empty"},
     {168,
