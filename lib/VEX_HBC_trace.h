@@ -104,13 +104,6 @@ inline Trace_Block block_of_text(const char* text) {
   return {shown, static_cast<uint32_t>(std::strlen(shown) + 1)};
 }
 
-inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a) {
-  if (trace_is_on(category)) {
-    const Errno_Kept kept;
-    tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], 1, a.bytes, a.length);
-  }
-}
-
 inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a, Trace_Block b) {
   if (trace_is_on(category)) {
     const Errno_Kept kept;
