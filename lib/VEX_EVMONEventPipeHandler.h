@@ -1,4 +1,5 @@
-// Owner of the event pipe, which wakes a caller when synthesized events wait.
+// Owner of the event pipe, which wakes a caller when synthesized events wait. A byte in it says no more than that; how
+// many there are says nothing about how many events wait.
 #pragma once
 
 #include "VEX_EVMONHandler.h"
@@ -9,7 +10,8 @@ class EVMONEventPipeHandler : public EVMONHandler {
   explicit EVMONEventPipeHandler(char* path);       // a monitor file in the place of a pipe
   ~EVMONEventPipeHandler() override;
 
-  // Delivers one queued event.
+  // Takes one event from the queue, whether or not a byte waits, and delivers it; then wakes the caller for the next.
+  // A new configuration takes effect here, in the caller's thread.
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
   int32_t getWriteFd() { return evmon_pipe_write_fd; }
 

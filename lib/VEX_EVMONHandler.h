@@ -1,5 +1,18 @@
 // Base of the VEX-mode handlers: it owns a descriptor, registers it, routes a ready descriptor to its handler, and has
 // the operations with which every handler builds events and fills a caller's outputs.
+//
+// What the interface leaves open:
+// - A handler that memory has no place for in the registry is left without a descriptor; one whose path cannot be kept
+//   is as one whose monitor could not be opened, with `ENOMEM` as result and error. A pipe needs no path.
+// - When two handlers have the same descriptor, because somebody closed it behind the library's back and the system
+//   handed it out again, the registry stays free of handlers that are gone: leaving empties the first slot of the
+//   descriptor, and the other handler keeps the second.
+// - A number of a node or an adapter that the lists have no place for is left out; the others count.
+// - The adapters that come with a joining node are those that the cluster services report up and that the configuration
+//   knows, by node, name and address. They are named by their numbers in the table that is about to take effect, as
+//   that one is in force when the event is taken; in the table still in force they are up from then on.
+// - Without memory for an event nothing of it is told: constructAdapterEventOnNode() fails with `HB_ENOMEM` and leaves
+//   the states of the adapters as they were, the others leave the pointer null.
 #pragma once
 
 #include <cstdint>
@@ -16,6 +29,12 @@ struct FDHandlerArray {
   EVMONHandler* handler;
 };
 typedef FDHandlerArray HandlerInstancesMap;
+
+// What the list of adapters of an event has for an adapter that the event is about.
+inline constexpr Hb_Incarnation VEX_named_in_group = 0;
+
+// In the place of a node's number: no node is named.
+inline constexpr zu_int32_t VEX_no_node = -1;
 
 class EVMONHandler {
  public:
@@ -49,6 +68,7 @@ class EVMONHandler {
   void constructConfigEvent(Hb_VEX_Event** _evt);
 
   // A new event about the node's adapters; there is none when no adapter is concerned.
+  // Fails when the cluster services do not say which adapters a joining node has.
   Hb_Rc constructAdapterEventOnNode(zu_int32_t _node, Hb_VEX_Event** _evt, zu_int32_t _evtType);
 
   // Each answers a caller without the queue.
@@ -73,11 +93,18 @@ class EVMONHandler {
   void generate_event_for_config_change(Hb_Configuration_Internal* table1, Hb_Configuration_Internal* table2,
                                         Hb_VEX_Event** event);
 
-  // The registry. Slots are only appended: one that was emptied stays empty.
+  // The registry. Slots are only appended: one that was emptied stays empty. The array is never freed.
   static int32_t numbersOfFileDescriptors;  // live ones
   static int32_t handlerListSlots;          // capacity
   static int32_t currentSlots;              // ever used
   static HandlerInstancesMap* handlerInstances;
+
+  // While it is set, a monitor that cannot be opened as there are none at all (-1) is no error to be traced.
+  static bool absence_is_no_error;
+
+ private:
+  int32_t open_and_register(char* fname, const char* p_initstr);
+  void drop_descriptor();
 
  protected:
   int32_t evmon_fd;

@@ -19,6 +19,13 @@ enum VEX_Event_Type : uint32_t {
   VEX_Daemon_Up = 1,  // only when the node is down because its group-services daemon was
 };
 
+// A new event of that group type with nothing in it, or null without memory. The membership is the caller's to fill:
+// 384 KiB are not written twice.
+Hb_VEX_Event* VEX_new_event(Hb_Group_Type type);
+
+// A new event that says that the configuration changed, or null. Its group is of no kind that would be copied.
+Hb_VEX_Event* VEX_new_configuration_event();
+
 Hb_Boolean VEX_event_queue_is_empty();
 
 // Numbers the event and appends it. The pipe is written by whoever has appended all events of one notification.
@@ -33,4 +40,5 @@ void VEX_display_event_list();
 // Writes one byte when an event waits, and otherwise starts the numbering anew.
 Hb_Rc VEX_write_to_event_pipe();
 
+// Takes one number out of the queue's numbering.
 zu_int32_t hb_vex_next_event_sequence();
