@@ -1,1 +1,247 @@
 #include "VEX_EVMONNodeLivenessHandler.h"
+
+#include <cerrno>
+#include <memory>
+#include <utility>
+
+#include "hb_communication/vex_table_build.h"
+#include "vex_outputs.h"
+#include "vex_platform_records.h"
+#include "vex_waiting_table.h"
+
+namespace {
+
+typedef zu_evm_event_node_liveness_t Report;
+
+Hb_Node_config_state* node_of(const Hb_Configuration_Internal& table, uint32_t node) {
+  return static_cast<Hb_Node_config_state*>(Hash_search(node, table.node_hash));
+}
+
+bool is_in_state(const Hb_Node_config_state* node, Hb_Entity_State state) {
+  return node != nullptr && node->state == state;
+}
+
+void trace_report(Trace_Record record, const Report& report) {
+  trace_data(Trace_Info, record,
+             {block_of(report.event_type), block_of(report.node_number), block_of(report.node_id),
+              block_of(report.sequence_number), block_of(report.reason_number)});
+}
+
+// One report of a node that went down or came up, and what the tables say of the node before and after it.
+class Node_Change {
+ public:
+  Node_Change(EVMONHandler& handler, Report& report, const Vex_Outputs& out)
+      : handler_(handler), report_(report), out_(out), node_(static_cast<zu_int32_t>(report.node_number)) {}
+
+  Hb_Rc tell();
+
+ private:
+  Hb_Rc rebuild(zu_vex_net_intf_info_t* interfaces);
+  Hb_Rc went_down();
+  Hb_Rc came_up();
+  Hb_Rc deliver_nothing(Hb_Seq_Num seqnum);
+  Hb_Rc deliver_stale(Trace_Record record);
+  Hb_Rc deliver_repeated();
+  Hb_Rc deliver_death(std::unique_ptr<Hb_VEX_Event> configuration, bool is_node_death_known);
+  void deliver_adapters(Hb_Group& adapters);
+  void queue_node_death();
+  void deliver_node_death();
+  void deliver_new_table();
+
+  Hb_Seq_Num number_of_report() const { return static_cast<Hb_Seq_Num>(report_.sequence_number); }
+
+  EVMONHandler& handler_;
+  Report& report_;
+  Vex_Outputs out_;
+  zu_int32_t node_;
+  Hb_Node_config_state* old_ = nullptr;
+  const Hb_Node_config_state* new_ = nullptr;
+};
+
+Hb_Rc Node_Change::tell() {
+  trace_report(trace_node_liveness, report_);
+  if (node_ == global_config_tbl.local_node_number) {
+    return deliver_nothing(number_of_report());
+  }
+  old_ = node_of(global_config_tbl, report_.node_number);
+  zu_vex_net_intf_info_t* list = nullptr;
+  const bool is_refreshed = hb_get_new_net_intf_info(&list) == Hb_Success;
+  const Interface_List interfaces(list);
+  if (!is_refreshed) {
+    return deliver_nothing(0);
+  }
+  const Hb_Rc rc = rebuild(interfaces.get());
+  if (rc != Hb_Success) {
+    return rc;
+  }
+  new_ = node_of(global_config_tbl_new, report_.node_number);
+  return report_.event_type == ZU_EVM_EVENT_DOWN ? went_down() : came_up();
+}
+
+Hb_Rc Node_Change::rebuild(zu_vex_net_intf_info_t* interfaces) {
+  zu_evm_event_metadata_t metadata = {};
+  metadata.category = ZU_EVM_EVENT_CATEGORY_NODE_LIVENESS;
+  metadata.event.p_node_liveness = &report_;
+  return hb_vex_update_global_tbl(&global_config_tbl_new, &metadata, &global_config_tbl, interfaces);
+}
+
+Hb_Rc Node_Change::deliver_nothing(Hb_Seq_Num seqnum) {
+  handler_.fillInNodeEventInfo(node_, HB_EVENT_NONE, out_.name, out_.group);
+  return deliver_no_event(out_, seqnum);
+}
+
+Hb_Rc Node_Change::deliver_stale(Trace_Record record) {
+  trace_report(record, report_);
+  return deliver_no_event(out_, 0);
+}
+
+Hb_Rc Node_Change::deliver_repeated() {
+  const Hb_Rc rc = deliver_nothing(number_of_report());
+  trace_values(Trace_Info, trace_node_repeated, report_.event_type, report_.node_number, old_->state, old_->reason);
+  return rc;
+}
+
+Hb_Rc Node_Change::went_down() {
+  if (is_in_state(new_, Hb_Entity_Up)) {
+    return deliver_stale(trace_node_death_is_stale);
+  }
+  const bool was_down = is_in_state(old_, Hb_Entity_Down);
+  if (was_down && old_->reason != Hb_Entity_State_Reason_BRIXD_Down) {
+    return deliver_repeated();
+  }
+  // Made first: without it nothing of this is told.
+  std::unique_ptr<Hb_VEX_Event> configuration(VEX_new_configuration_event());
+  return configuration != nullptr ? deliver_death(std::move(configuration), was_down) : Hb_Failure;
+}
+
+// The death of a node whose group-services daemon was down is known already; its adapters are not.
+Hb_Rc Node_Change::deliver_death(std::unique_ptr<Hb_VEX_Event> configuration, bool is_node_death_known) {
+  Hb_VEX_Event* built = nullptr;
+  const Hb_Rc rc = handler_.constructAdapterEventOnNode(node_, &built, HB_EVENT_DEATH);
+  std::unique_ptr<Hb_VEX_Event> adapters(built);
+  mark_adapters_down_in_waiting_table(report_.node_number);
+  if (adapters == nullptr && rc != Hb_Success) {
+    return Hb_Failure;
+  }
+  *out_.events = HB_EVENT_DEATH;
+  if (adapters != nullptr) {
+    deliver_adapters(adapters->group);
+    if (!is_node_death_known) {
+      queue_node_death();
+    }
+  } else if (!is_node_death_known) {
+    deliver_node_death();
+  } else {
+    deliver_new_table();
+    configuration = nullptr;
+  }
+  if (configuration != nullptr) {
+    VEX_add_event_at_end(configuration.release());
+  }
+  adapters = nullptr;
+  return VEX_write_to_event_pipe();
+}
+
+void Node_Change::deliver_adapters(Hb_Group& adapters) {
+  trace(Trace_Info, trace_adapters_of_dead_node);
+  if (networkEventSubscriptionName[0] != '\0') {
+    put_name(out_.name, networkEventSubscriptionName);
+  } else {
+    *out_.events = HB_EVENT_NONE;
+    put_name(out_.name, empty_event_name);
+    trace(Trace_Info, trace_dead_node_adapters_unsubscribed);
+  }
+  *out_.seqnum = 0;
+  handler_.copy_adapter_Hb_Group(&adapters, out_.group);
+}
+
+void Node_Change::queue_node_death() {
+  Hb_VEX_Event* death = nullptr;
+  handler_.constructNodeEvent(node_, &death, HB_EVENT_DEATH);
+  if (death != nullptr) {
+    VEX_add_event_at_end(death);
+  } else {
+    trace(Trace_Info, trace_no_node_death_event);
+  }
+}
+
+void Node_Change::deliver_node_death() {
+  handler_.fillInNodeEventInfo(node_, HB_EVENT_DEATH, out_.name, out_.group);
+  *out_.seqnum = number_of_report();
+  if (old_ != nullptr) {
+    old_->state = Hb_Entity_Down;
+    if (new_ != nullptr) {
+      old_->reason = new_->reason;
+    }
+  }
+}
+
+void Node_Change::deliver_new_table() {
+  VEX_copy_and_delete_global_config_tbl();
+  old_ = nullptr;
+  new_ = nullptr;
+  *out_.events = HB_EVENT_CONFIGURATION;
+  *out_.seqnum = 0;
+  put_name(out_.name, configuration_event_name);
+}
+
+Hb_Rc Node_Change::came_up() {
+  if (is_in_state(new_, Hb_Entity_Down)) {
+    return deliver_stale(trace_node_return_is_stale);
+  }
+  if (is_in_state(old_, Hb_Entity_Up)) {
+    return deliver_repeated();
+  }
+  std::unique_ptr<Hb_VEX_Event> configuration(VEX_new_configuration_event());
+  if (configuration == nullptr) {
+    return Hb_Failure;
+  }
+  *out_.events = HB_EVENT_JOIN;
+  handler_.fillInNodeEventInfo(node_, HB_EVENT_JOIN, out_.name, out_.group);
+  *out_.seqnum = number_of_report();
+  VEX_add_event_at_end(configuration.release());
+  Hb_VEX_Event* adapters = nullptr;
+  handler_.constructAdapterEventOnNode(node_, &adapters, HB_EVENT_JOIN);
+  if (adapters != nullptr) {
+    VEX_add_event_at_end(adapters);
+  }
+  if (old_ != nullptr) {
+    old_->state = Hb_Entity_Up;
+  }
+  return VEX_write_to_event_pipe();
+}
+
+Hb_Rc cannot_be_read(int read_result, int descriptor) {
+  trace_values(Trace_Errors, trace_node_liveness_read_failed, read_result, errno, descriptor);
+  return Hb_Failure;
+}
+
+}  // namespace
+
+EVMONNodeLivenessHandler::EVMONNodeLivenessHandler(char* path) : EVMONHandler(path, nullptr) {}
+
+Hb_Rc EVMONNodeLivenessHandler::handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) {
+  trace_values(Trace_Info, trace_node_liveness_begins, evmon_fd);
+  const Hb_Rc rc = read_and_tell({events, name, group, seqnum_p});
+  trace_values(Trace_Info, trace_node_liveness_ends, evmon_fd, rc);
+  return rc;
+}
+
+Hb_Rc EVMONNodeLivenessHandler::read_and_tell(const Vex_Outputs& out) {
+  zu_evm_event_node_or_split_merge_cfg_t record = {};
+  const int read_result = zu_evm_read_node_liveness(evmon_fd, &record);
+  if (read_result == ZU_EVM_NOTHING) {
+    trace(Trace_Info, trace_node_liveness_nothing);
+    *out.events = HB_EVENT_NONE;
+    return Hb_Success;
+  }
+  if (read_result == ZU_EVM_NODE_LIVENESS_RECORD && record.p_event_node_liveness != nullptr) {
+    const Monitor_Record<Report> report(record.p_event_node_liveness);
+    return Node_Change(*this, *report, out).tell();
+  }
+  if (read_result == ZU_EVM_SPLIT_MERGE_RECORD && record.p_event_split_merge_cfg != nullptr) {
+    const Monitor_Record<zu_evm_event_split_merge_cfg_t> split_merge(record.p_event_split_merge_cfg);
+    return SplitMergeEventHandler(split_merge.get(), out.events, out.name, out.group, out.seqnum);
+  }
+  return cannot_be_read(read_result, evmon_fd);
+}

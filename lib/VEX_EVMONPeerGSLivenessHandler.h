@@ -1,4 +1,7 @@
 // The monitor of the peer group-services daemon.
+//
+// A notification is traced, and is no event: that a node comes back with its daemon is told when a message of the
+// daemon was received.
 #pragma once
 
 #include "VEX_EVMONHandler.h"

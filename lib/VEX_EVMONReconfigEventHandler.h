@@ -1,4 +1,6 @@
 // The monitor of cluster reconfiguration.
+//
+// A notification is traced, and is no event; the table stays as it is, as for the list of nodes.
 #pragma once
 
 #include "VEX_EVMONConfigurationHandler.h"

@@ -1,4 +1,6 @@
 // The monitor of the repository disk.
+//
+// A notification is traced, and is no event: the disk is none of the things that the configuration knows.
 #pragma once
 
 #include "VEX_EVMONHandler.h"

@@ -1,4 +1,7 @@
 // The monitor of the cluster's sites.
+//
+// A notification is traced, record by record, and is no event. From the records that name this node it keeps what they
+// say of the node and of its site; the deletion of the site makes what is kept of the site void.
 #pragma once
 
 #include "VEX_EVMONConfigurationHandler.h"
@@ -16,4 +19,9 @@ class EVMONSiteConfigEventHandler : public EVMONConfigurationHandler {
   bool cached_local_site_info_obtained;
   zu_vex_site_policy_t cached_site_merge_policy;
   bool cached_site_merge_policy_obtained;
+
+ private:
+  Hb_Rc read_and_learn(Hb_Events& events);
+  void learn(const zu_evm_event_site_cfg_t& record);
+  void learn_site(const zu_evm_event_site_cfg_t& record);
 };

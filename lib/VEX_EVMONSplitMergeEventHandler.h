@@ -1,4 +1,5 @@
-// The monitor of its own for splits and merges.
+// The monitor of its own for splits and merges. What it delivers is delivered by the monitor of nodes, too, which tells
+// it: here nothing but "nothing to read" succeeds, and a record is given back unread.
 #pragma once
 
 #include "VEX_EVMONConfigurationHandler.h"

@@ -1,1 +1,128 @@
 #include "VEX_migration.h"
+
+#include <algorithm>
+#include <memory>
+#include <new>
+
+#include "VEX_EVMONAdapterEventHandler.h"
+#include "VEX_HBC_trace.h"
+#include "hb_client/migration.h"
+#include "hb_communication/connection.h"
+#include "hb_communication/vex_table_build.h"
+#include "hb_global_data/vex_handler_set.h"
+
+bool migrate_to_vex_prep = false;
+
+namespace {
+
+// A build starts the node table anew; a trial must not do that to the table in force.
+class Node_Table_Kept {
+ public:
+  Node_Table_Kept() { std::copy(std::begin(global_node_tbl), std::end(global_node_tbl), nodes_); }
+  Node_Table_Kept(const Node_Table_Kept&) = delete;
+  Node_Table_Kept& operator=(const Node_Table_Kept&) = delete;
+  ~Node_Table_Kept() {
+    std::copy(std::begin(nodes_), std::end(nodes_), global_node_tbl);
+    global_num_nodes = count_;
+  }
+
+ private:
+  Hb_Boolean nodes_[HB_MAX_NODES];
+  const int32_t count_ = global_num_nodes;
+};
+
+Hb_Rc build_trial_table(Hb_Configuration_Internal& trial) {
+  const Node_Table_Kept kept;
+  return hb_vex_update_global_tbl(&trial, nullptr, nullptr, nullptr);
+}
+
+// Fails when the platform does not have this node under its number, or not all nodes of the daemon.
+Hb_Rc check_trial_table(Hb_Configuration_Internal& trial) {
+  if (global_config_tbl.local_node_number != trial.local_node_number) {
+    trace_values(Trace_Errors, trace_migration_local_node_differs, global_config_tbl.local_node_number,
+                 trial.local_node_number);
+    return Hb_Failure;
+  }
+  const Hb_Rc rc = VEX_find_tbl1_node_in_tbl2(&global_config_tbl, &trial);
+  if (rc != Hb_Success) {
+    set_hb_errno(HB_EMIGRATE_TBL);
+    trace_values(Trace_Errors, trace_migration_node_missing, rc);
+  }
+  return rc;
+}
+
+Hb_Rc stop_preparing() {
+  VEX_delete_global_event_handlers();
+  return Hb_Failure;
+}
+
+}  // namespace
+
+Hb_Rc VEX_find_tbl1_node_in_tbl2(Hb_Configuration_Internal* _tbl1, Hb_Configuration_Internal* _tbl2) {
+  const int count = _tbl1->node_list != nullptr ? std::min<int>(_tbl1->Hb_num_nodes, HB_MAX_NODES) : 0;
+  for (int index = 0; index < count; ++index) {
+    const int32_t node = _tbl1->node_list[index].node_num;
+    if (Hash_search(static_cast<uint32_t>(node), _tbl2->node_hash) == nullptr) {
+      set_hb_errno(HB_ENODEMISSING);
+      trace_values(Trace_Errors, trace_node_missing_from_table, node);
+      return Hb_Failure;
+    }
+  }
+  return Hb_Success;
+}
+
+Hb_Rc hb_migrate_to_vex_prep(void) {
+  migrate_to_vex_prep = true;
+  const Hb_Rc created = VEX_create_global_event_handlers();
+  if (created != Hb_Success) {
+    set_hb_errno(HB_EMIGRATE_PREP);
+    trace_values(Trace_Errors, trace_migration_handlers_failed, created, HB_EMIGRATE_PREP);
+    return stop_preparing();
+  }
+  // A yardstick alone. What it holds is not released: with the handlers it stays for the rest of the process.
+  Hb_Configuration_Internal trial = {};
+  const Hb_Rc built = build_trial_table(trial);
+  if (built != Hb_Success) {
+    trace_values(Trace_Errors, trace_migration_table_failed, built);
+    return Hb_Failure;
+  }
+  return check_trial_table(trial) == Hb_Success ? Hb_Success : stop_preparing();
+}
+
+Hb_Rc hb_migrate_to_vex_commit(void) {
+  hb_vex_delayed_daemon_shutdown();
+  IsVEX = Hb_True;
+  hb_remove_client_select();
+  hb_remove_socket();
+  hb_migrate_construct_global_table_and_events();
+  migrate_to_vex_prep = false;
+  return Hb_Success;
+}
+
+Hb_Rc hb_migrate_to_vex_abort(void) {
+  VEX_delete_global_event_handlers();
+  return Hb_Success;
+}
+
+void hb_migrate_construct_global_table_and_events() {
+  if (adapter_event_handler_p == nullptr) {
+    trace(Trace_Info, trace_no_adapter_handler);
+    set_hb_errno(HB_EMIGRATE_EVENTS);
+    return;
+  }
+  trace(Trace_Info, trace_vex_start);
+  // What the driver would deliver at once goes to the queue without a notification; these are for nobody.
+  const std::unique_ptr<Hb_Group> group(new (std::nothrow) Hb_Group);
+  if (group == nullptr) {
+    set_hb_errno(HB_EMIGRATE_EVENTS);
+    return;
+  }
+  Hb_Events events = HB_EVENT_NONE;
+  Hb_Name name = {};
+  Hb_Seq_Num sequence = 0;
+  zu_vex_net_intf_info_t* interfaces = nullptr;
+  hb_refresh_boot_ip_addrs(&interfaces);
+  // The interfaces are dropped, not released.
+  adapter_event_handler_p->update_global_table_and_construct_events(&events, name, group.get(), &sequence, nullptr,
+                                                                    interfaces);
+}

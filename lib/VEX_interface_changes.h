@@ -1,0 +1,38 @@
+// What the monitor of interfaces and the monitor of their addresses have in common.
+#pragma once
+
+#include "VEX_EVMONConfigurationHandler.h"
+#include "platform_membership.h"
+#include "vex_outputs.h"
+#include "vex_platform_records.h"
+
+// Whether the node starts with that interface. Without an address the name alone counts.
+bool is_boot_interface(uint32_t node, const char* name, zu_vex_IP_address6_t* address);
+
+// The adapter is one of the node's interface of that name.
+bool is_adapter_on(const Hb_Configuration_Internal& table, const Hb_Adapter& adapter, uint32_t node, const char* name);
+
+// Lists the interfaces anew and tells what the notification changes. Fails with HB_EVEXTBL_INTF, and writes nothing,
+// when the interfaces cannot be listed.
+Hb_Rc rebuild_and_tell(EVMONConfigurationHandler& handler, zu_evm_event_metadata_t metadata, const Vex_Outputs& out);
+
+// An alias is in no table: that it came or went is all there is to tell.
+inline Hb_Rc deliver_alias(const Vex_Outputs& out) {
+  *out.events = HB_EVENT_ALIAS;
+  return Hb_Success;
+}
+
+// Calls use(adapter) for each address of the node's interface of that name.
+template <typename Use>
+void for_each_adapter_on(const Hb_Configuration_Internal& table, uint32_t node, const char* name, Use use) {
+  if (node >= HB_MAX_NODES || table.Hb_adapters_per_node <= 0) {
+    return;
+  }
+  const auto slots = static_cast<uint32_t>(table.Hb_adapters_per_node);
+  for (uint32_t slot = 0; slot < slots; ++slot) {
+    auto* adapter = static_cast<Hb_Adapter*>(Hash_search(node * slots + slot, table.adap_hash));
+    if (adapter != nullptr && is_adapter_on(table, *adapter, node, name)) {
+      use(*adapter);
+    }
+  }
+}

@@ -1,0 +1,27 @@
+// The table that waits to take effect was built before what is told now, and must not bring back what was before it.
+#pragma once
+
+#include "hb_global_data/state.h"
+
+inline void mark_adapters_down_in_waiting_table(uint32_t node) {
+  const Hb_Configuration_Internal& table = global_config_tbl_new;
+  if (node >= HB_MAX_NODES || table.Hb_adapters_per_node <= 0) {
+    return;
+  }
+  const auto slots = static_cast<uint32_t>(table.Hb_adapters_per_node);
+  for (uint32_t slot = 0; slot < slots; ++slot) {
+    auto* adapter = static_cast<Hb_Adapter*>(Hash_search(node * slots + slot, table.adap_hash));
+    if (adapter != nullptr) {
+      adapter->Hb_state = Hb_Entity_Down;
+    }
+  }
+}
+
+inline void mark_node_down_in_waiting_table(uint32_t number, Hb_Entity_State_Reason reason) {
+  auto* node = static_cast<Hb_Node_config_state*>(Hash_search(number, global_config_tbl_new.node_hash));
+  if (node != nullptr && node->state == Hb_Entity_Up) {
+    node->state = Hb_Entity_Down;
+    node->reason = reason;
+  }
+  mark_adapters_down_in_waiting_table(number);
+}
