@@ -1,1 +1,153 @@
 #include "VEX_EVMONConfigurationHandler.h"
+
+#include <memory>
+
+#include "VEX_HBC_trace.h"
+#include "VEX_migration.h"
+#include "hb_communication/vex_table_build.h"
+#include "vex_outputs.h"
+
+namespace {
+
+using Event = std::unique_ptr<Hb_VEX_Event>;
+
+// What the new table changes; of each kind one event or none.
+struct Changes {
+  Event adapter_death;
+  Event node_death;
+  Event config;
+  Event adapter_join;
+  Event node_join;
+
+  bool has_deaths() const { return adapter_death != nullptr || node_death != nullptr; }
+};
+
+Hb_Rc find_changes(EVMONHandler& handler, Changes& changes) {
+  Hb_VEX_Event* adapter_death = nullptr;
+  Hb_VEX_Event* node_death = nullptr;
+  Hb_VEX_Event* config = nullptr;
+  Hb_VEX_Event* adapter_join = nullptr;
+  Hb_VEX_Event* node_join = nullptr;
+  const Hb_Rc rc = handler.compare_global_config_tables(&global_config_tbl_new, &adapter_death, &node_death, &config,
+                                                        &adapter_join, &node_join);
+  changes.adapter_death.reset(adapter_death);
+  changes.node_death.reset(node_death);
+  changes.config.reset(config);
+  changes.adapter_join.reset(adapter_join);
+  changes.node_join.reset(node_join);
+  return rc;
+}
+
+// All or nothing: a difference that is not told would be forgotten with the next table.
+Hb_Rc prepare(EVMONHandler& handler, Changes& changes) {
+  if (find_changes(handler, changes) != Hb_Success) {
+    return fail(HB_ENOMEM);
+  }
+  if (!migrate_to_vex_prep && changes.has_deaths()) {
+    changes.config.reset(VEX_new_configuration_event());
+    return changes.config != nullptr ? Hb_Success : fail(HB_ENOMEM);
+  }
+  return Hb_Success;
+}
+
+void append(Event event) {
+  if (event != nullptr) {
+    VEX_add_event_at_end(event.release());
+  }
+}
+
+// The death is delivered at once to who has read a notification, and to all others by the queue.
+void deliver_adapter_death(EVMONHandler& handler, Event& death, const Vex_Outputs& out, bool at_once) {
+  trace(Trace_Info, trace_update_adapter_deaths);
+  *out.events = death->group.Hb_events;
+  if (!put_subscription_name(out.events, out.name, networkEventSubscriptionName)) {
+    trace(Trace_Info, trace_update_without_name);
+  }
+  *out.seqnum = 0;
+  if (at_once) {
+    handler.copy_adapter_Hb_Group(&death->group, out.group);
+  } else {
+    append(std::move(death));
+  }
+}
+
+void deliver_configuration(const Vex_Outputs& out) {
+  *out.events = HB_EVENT_CONFIGURATION;
+  put_name(out.name, configuration_event_name);
+}
+
+void deliver_first(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool at_once) {
+  if (changes.adapter_death != nullptr) {
+    deliver_adapter_death(handler, changes.adapter_death, out, at_once);
+  } else if (changes.node_death != nullptr) {
+    deliver_no_event(out, 0);
+  } else {
+    deliver_configuration(out);
+  }
+}
+
+void append_node_death(Event death) {
+  if (death != nullptr) {
+    trace(Trace_Info, trace_update_node_deaths);
+    append(std::move(death));
+  }
+}
+
+void put_new_table_in_force() {
+  trace(Trace_Info, trace_update_takes_effect);
+  VEX_copy_and_delete_global_config_tbl();
+  hb_vex_dump_global_table(&global_config_tbl, "Update global table: current table after copy");
+}
+
+// Deaths come first. With deaths the old table stays until the configuration event behind them is taken.
+void tell(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool at_once) {
+  const bool takes_effect = !migrate_to_vex_prep && !changes.has_deaths();
+  if (migrate_to_vex_prep) {
+    append(std::move(changes.adapter_death));
+  } else {
+    deliver_first(handler, changes, out, at_once);
+  }
+  append_node_death(std::move(changes.node_death));
+  append(std::move(changes.config));
+  append(std::move(changes.node_join));
+  append(std::move(changes.adapter_join));
+  if (takes_effect) {
+    put_new_table_in_force();
+  }
+}
+
+Hb_Rc update(EVMONHandler& handler, const Vex_Outputs& out, zu_evm_event_metadata_t* metadata,
+             zu_vex_net_intf_info_t* interfaces) {
+  hb_vex_dump_global_table(&global_config_tbl, "Update global table: old table");
+  Hb_Rc rc = hb_vex_update_global_tbl(&global_config_tbl_new, metadata, &global_config_tbl, interfaces);
+  if (rc != Hb_Success) {
+    return rc;
+  }
+  hb_vex_dump_global_table(&global_config_tbl_new, "Update global table: new table");
+  {
+    Changes changes;
+    rc = prepare(handler, changes);
+    if (rc != Hb_Success) {
+      return rc;
+    }
+    tell(handler, changes, out, metadata != nullptr);
+  }
+  return VEX_write_to_event_pipe();
+}
+
+}  // namespace
+
+Hb_Rc EVMONConfigurationHandler::handler(Hb_Events* /*events*/, char* /*name*/, Hb_Group* /*group*/,
+                                         Hb_Seq_Num* /*seqnum_p*/) {
+  return Hb_Success;
+}
+
+Hb_Rc EVMONConfigurationHandler::update_global_table_and_construct_events(Hb_Events* events, char* name,
+                                                                          Hb_Group* group, Hb_Seq_Num* seqnum_p,
+                                                                          zu_evm_event_metadata_t* metadata,
+                                                                          zu_vex_net_intf_info_t* interfaces) {
+  trace_values(Trace_Info, trace_update_begins, evmon_fd);
+  const Hb_Rc rc = update(*this, {events, name, group, seqnum_p}, metadata, interfaces);
+  trace_values(Trace_Info, trace_update_ends, evmon_fd, rc);
+  return rc;
+}

@@ -1,4 +1,9 @@
 // Base of the handlers whose notifications may change the configuration.
+//
+// What the interface leaves open:
+// - When only nodes died, no death is delivered at once, and the caller gets the empty event.
+// - Without memory for one of the events nothing is told, and the table in force stays: the next notification finds the
+//   same differences again.
 #pragma once
 
 #include "VEX_EVMONHandler.h"
@@ -11,6 +16,8 @@ class EVMONConfigurationHandler : public EVMONHandler {
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
 
   // Builds the table anew, and tells the differences to the one in force: one by the outputs, the others by the queue.
+  // The group is written with a notification only. Fails as the table build does, with HB_ENOMEM, or when the caller
+  // cannot be woken.
   Hb_Rc update_global_table_and_construct_events(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p,
                                                  zu_evm_event_metadata_t* metadata, zu_vex_net_intf_info_t* interfaces);
 };

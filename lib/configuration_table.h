@@ -1,6 +1,8 @@
 // The configuration table: the one in-memory description of the cluster.
 #pragma once
 
+#include <algorithm>
+
 #include "hash.h"
 #include "hb_client/configuration.h"
 
@@ -34,6 +36,11 @@ inline Hb_Adapter_Number adapter_number_limit(const Hb_Configuration_Internal& t
 // How many records the adapter list holds; none while there is no list.
 inline int adapters_in_list(const Hb_Configuration_Internal& table) {
   return table.Hb_global_adapter_list != nullptr ? table.Hb_num_adapters : 0;
+}
+
+// The same of the node list, whatever the count says.
+inline int nodes_in_list(const Hb_Configuration_Internal& table) {
+  return table.node_list != nullptr ? std::clamp<int>(table.Hb_num_nodes, 0, HB_MAX_NODES) : 0;
 }
 
 inline bool is_node_number(const Hb_Configuration_Internal& table, int node) {

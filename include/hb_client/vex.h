@@ -46,7 +46,11 @@ HB_API Hb_Rc hb_vex_msg_received_from(Hb_Node_Number node);
  */
 HB_API Hb_Rc hb_vex_delayed_daemon_shutdown(void);
 
-/** Reads the boot addresses anew, and tells by events what that changes. */
+/**
+ * Reads the boot addresses anew, and tells by events which adapters and nodes that adds and takes away. The new
+ * configuration is in force when the function returns, unless something was taken away: it then is when the
+ * configuration event behind the deaths is taken. Nothing changes where there are no monitors.
+ */
 HB_API void hb_refresh_boot_ip_addrs_and_update_events(void);
 
 HB_END_DECLS

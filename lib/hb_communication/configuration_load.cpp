@@ -4,33 +4,16 @@
 
 #include <algorithm>
 #include <cstddef>
-#include <memory>
 #include <new>
 
 #include "VEX_HBC_trace.h"
+#include "hb_communication/configuration_parts.h"
 #include "hb_global_data/address_text.h"
 #include "hb_global_data/node_table.h"
 #include "hb_global_data/record_index.h"
 #include "hb_protocol/configuration_message.h"
 
 namespace {
-
-constexpr int node_table_size = 4098;  // twice the nodes that a cluster can have
-
-struct Hash_Deleter {
-  void operator()(H_table_str* table) const { Hash_free(table); }
-};
-using Hash_Table = std::unique_ptr<H_table_str, Hash_Deleter>;
-
-// What the configuration table owns, while it is built.
-struct Tables {
-  std::unique_ptr<Hb_Adapter[]> adapters;
-  Hash_Table by_number;
-  Hash_Table nodes_by_number;
-  std::unique_ptr<Hb_Node_config_state[]> nodes;
-  Hash_Table by_address;
-  int node_count = 0;
-};
 
 size_t adapters_end(const hb_configuration_header& header) {
   return sizeof header + static_cast<size_t>(header.num_adapters) * sizeof(Hb_Adapter);
@@ -50,7 +33,7 @@ bool is_usable(const Message& message) {
          message.holds(adapters_end(header), static_cast<size_t>(header.num_networks) * sizeof(Hb_Network));
 }
 
-void add_node(Tables& tables, Hb_Adapter_Number node) {
+void add_node(Configuration_Parts& tables, Hb_Adapter_Number node) {
   if (Hash_search(node, tables.nodes_by_number.get()) != nullptr) {
     return;
   }
@@ -72,7 +55,7 @@ void trace_repeated_address(Hb_Adapter& adapter) {
              {&adapter.Hb_adapter_num, sizeof adapter.Hb_adapter_num}, {&adapter.Hb_state, sizeof adapter.Hb_state});
 }
 
-void add_address(Tables& tables, Hb_Adapter& adapter) {
+void add_address(Configuration_Parts& tables, Hb_Adapter& adapter) {
   H_IPv6_key_t key;
   std::memcpy(&key, &adapter.Hb_ip_address, sizeof key);
   if (Hash_search_IPv6(&key, tables.by_address.get()) != nullptr) {
@@ -82,7 +65,7 @@ void add_address(Tables& tables, Hb_Adapter& adapter) {
   }
 }
 
-void add_adapter(Tables& tables, const hb_configuration_header& header, Hb_Adapter& adapter) {
+void add_adapter(Configuration_Parts& tables, const hb_configuration_header& header, Hb_Adapter& adapter) {
   const Hb_Adapter_Number number = adapter.Hb_adapter_num;
   Hash_insert(number, tables.by_number.get(), &adapter);
   const Hb_Adapter_Number node = number / static_cast<Hb_Adapter_Number>(header.adapters_per_node);
@@ -94,7 +77,7 @@ void add_adapter(Tables& tables, const hb_configuration_header& header, Hb_Adapt
 }
 
 // Throws std::bad_alloc.
-void build(Tables& tables, const hb_configuration_header& header, const Message& message) {
+void build(Configuration_Parts& tables, const hb_configuration_header& header, const Message& message) {
   const auto count = static_cast<size_t>(header.num_adapters);
   tables.adapters = std::make_unique_for_overwrite<Hb_Adapter[]>(count);
   tables.by_number.reset(Hash_init("Hb_Adapter list", prime(header.num_adapters * 2)));
@@ -105,17 +88,7 @@ void build(Tables& tables, const hb_configuration_header& header, const Message&
   std::for_each_n(tables.adapters.get(), count, [&](Hb_Adapter& adapter) { add_adapter(tables, header, adapter); });
 }
 
-// A number that comes twice leads to its last record, as it does in the tables.
-void index_records(const Hb_Configuration_Internal& table) {
-  adapter_index.start(table.adap_hash, adapter_number_limit(table));
-  std::for_each_n(table.Hb_global_adapter_list, table.Hb_num_adapters,
-                  [](Hb_Adapter& adapter) { adapter_index.add(adapter.Hb_adapter_num, adapter); });
-  node_index.start(table.node_hash, static_cast<uint32_t>(table.Hb_max_nodes));
-  std::for_each_n(table.node_list, table.Hb_num_nodes,
-                  [](Hb_Node_config_state& node) { node_index.add(static_cast<uint32_t>(node.node_num), node); });
-}
-
-void install(Tables& tables, const hb_configuration_header& header, const Message& message) {
+void install(Configuration_Parts& tables, const hb_configuration_header& header, const Message& message) {
   Hb_Configuration_Internal& table = global_config_tbl;
   table.local_node_number = static_cast<Hb_Node_Number>(header.local_node_number);
   table.Hb_max_nodes = header.max_nodes;
@@ -126,15 +99,10 @@ void install(Tables& tables, const hb_configuration_header& header, const Messag
   table.Hb_rem_node_down_sim_period = message.at<timeval>(offsetof(hb_configuration_header, rem_node_down_sim_period));
   table.Hb_local_node_down_sim_period =
       message.at<timeval>(offsetof(hb_configuration_header, local_node_down_sim_period));
-  table.Hb_num_nodes = tables.node_count;
-  table.Hb_global_adapter_list = tables.adapters.release();
-  table.adap_hash = tables.by_number.release();
-  table.node_hash = tables.nodes_by_number.release();
-  table.node_list = tables.nodes.release();
-  table.ip_hash = tables.by_address.release();
+  tables.release_to(table);
   message.copy(table.Hb_global_network_list, adapters_end(header),
                static_cast<size_t>(header.num_networks) * sizeof(Hb_Network));
-  index_records(table);
+  index_configuration();
 }
 
 // Builds beside the table in force, so that a failure changes nothing, and calls make_room before the exchange.
@@ -145,7 +113,7 @@ Hb_Rc load(const Message& message, Make_Room make_room) {
   }
   const auto header = message.at<hb_configuration_header>(0);
   try {
-    Tables tables;
+    Configuration_Parts tables;
     build(tables, header, message);
     make_room();
     install(tables, header, message);

@@ -5,6 +5,17 @@
 Record_Index<Hb_Adapter, HB_MAX_ADAPTERS> adapter_index;
 Record_Index<Hb_Node_config_state, HB_MAX_NODES> node_index;
 
+// A number that comes twice leads to its last record, as it does in the tables.
+void index_configuration() {
+  const Hb_Configuration_Internal& table = global_config_tbl;
+  adapter_index.start(table.adap_hash, adapter_number_limit(table));
+  std::for_each_n(table.Hb_global_adapter_list, table.Hb_num_adapters,
+                  [](Hb_Adapter& adapter) { adapter_index.add(adapter.Hb_adapter_num, adapter); });
+  node_index.start(table.node_hash, static_cast<uint32_t>(table.Hb_max_nodes));
+  std::for_each_n(table.node_list, table.Hb_num_nodes,
+                  [](Hb_Node_config_state& node) { node_index.add(static_cast<uint32_t>(node.node_num), node); });
+}
+
 namespace {
 
 bool has_configured_adapter(int node) {
@@ -38,8 +49,7 @@ void hb_init_global_node_tbl() {
 }
 
 void hb_deinit_global_config_and_node_tbl() {
-  adapter_index.forget();
-  node_index.forget();
+  forget_configuration();
   delete[] global_config_tbl.Hb_global_adapter_list;
   global_config_tbl.Hb_global_adapter_list = nullptr;
   delete[] global_config_tbl.node_list;

@@ -47,6 +47,15 @@ class Record_Index {
 extern Record_Index<Hb_Adapter, HB_MAX_ADAPTERS> adapter_index;      // of global_config_tbl.adap_hash
 extern Record_Index<Hb_Node_config_state, HB_MAX_NODES> node_index;  // of global_config_tbl.node_hash
 
+// Makes both anew from the records of global_config_tbl.
+void index_configuration();
+
+// The records of global_config_tbl are about to go.
+inline void forget_configuration() {
+  adapter_index.forget();
+  node_index.forget();
+}
+
 inline Hb_Adapter* find_configured_adapter(Hb_Adapter_Number number) {
   return adapter_index.find(number, global_config_tbl.adap_hash);
 }

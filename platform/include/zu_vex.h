@@ -126,8 +126,13 @@ struct zu_evm_event_metadata_t;
 
 /*
  * Each query returns 0 and hands out what it found, or another value and leaves the output alone. A platform without
- * cluster services yields -1. An empty list is null. What is handed out belongs to the caller, who gives it back with
- * the function of its kind below; whoever keeps a list may change its records, and may put other ones in.
+ * cluster services yields -1. An empty list is null. What is handed out belongs to the library, whole, until it gives it
+ * back with the function of its kind below. It sets and clears ZU_VEX_INTF_ALIAS in it.
+ *
+ * Records of clusters and nodes come back at once, and so do interfaces when the table that they are for is built. Boot
+ * addresses, and the interfaces of a start, are kept until boot addresses are read anew; those of a start that failed
+ * never come back, nor does the list of interfaces that a client moves to VEX mode with. What the library copies is
+ * never given back here.
  */
 int zu_vex_get_cluster_info(zu_vex_cluster_info_t** info);
 
