@@ -1,0 +1,386 @@
+// The monitor of nodes: what it tells of a node that went down or came up.
+#include "VEX_EVMONNodeLivenessHandler.h"
+
+#include "monitored_cluster.h"
+
+namespace hb_test {
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+using testing::Pair;
+
+constexpr uint64_t sequence = 0x500000007;
+constexpr uint32_t low_sequence = 7;
+
+class NodeLiveness : public MonitorTest<EVMONNodeLivenessHandler> {
+ protected:
+  static zu_evm_event_node_liveness_t report(zu_evm_event_type_t type, uint32_t node) {
+    return {type, node, 0x1122334455667788, sequence, 21, ZU_EVM_NODE_DOWN_LINK_DOWN};
+  }
+  Hb_Rc down(uint32_t node) { return take(report(ZU_EVM_EVENT_DOWN, node)); }
+  Hb_Rc up(uint32_t node) { return take(report(ZU_EVM_EVENT_UP, node)); }
+
+  void expect_nothing_told(Hb_Seq_Num number) {
+    EXPECT_EQ(0, out.events);
+    EXPECT_EQ("<EMPTY EVENT>", name());
+    EXPECT_EQ(number, out.sequence);
+    EXPECT_THAT(Monitored_Client::queue(), IsEmpty());
+    EXPECT_EQ(0, client.bytes_in_pipe());
+  }
+  void expect_node_in_group(uint32_t node, Hb_Events events) {
+    EXPECT_EQ(Hb_Node_Group, out.group->Hb_group_type);
+    EXPECT_EQ(events, out.group->Hb_events);
+    EXPECT_EQ(Hb_Group_Stable, out.group->Hb_group_status);
+    EXPECT_EQ(1, count_of(*out.group));
+    EXPECT_THAT(nodes_of(*out.group), ElementsAre(node));
+  }
+  void expect_empty_delivery(uint32_t node, Hb_Seq_Num number) {
+    expect_nothing_told(number);
+    expect_node_in_group(node, 0);
+  }
+};
+
+// Reading.
+
+TEST_F(NodeLiveness, ThatCannotBeReadFailsAndWritesNothing) {
+  platform_double().errno_after_trace = 5;
+  EXPECT_EQ(Hb_Failure, take_result(-1, ENXIO));
+  EXPECT_EQ(ENXIO, errno);
+  EXPECT_TRUE(out.untouched());
+  EXPECT_EQ(no_number, hb_get_errno());
+  EXPECT_THAT(traced(), ElementsAre(Pair(231U, info), Pair(11U, errors), Pair(284U, info)));
+  const auto fd = static_cast<uint64_t>(descriptor());
+  EXPECT_THAT(numbers_of(231), ElementsAre(fd));
+  EXPECT_THAT(numbers_of(11), ElementsAre(minus_one, ENXIO, fd));
+  EXPECT_THAT(numbers_of(284), ElementsAre(fd, 3));
+}
+
+TEST_F(NodeLiveness, ThatCannotBeReadFailsWithoutTraceAsWell) {
+  Monitored_Client::trace_nothing();
+  EXPECT_EQ(Hb_Failure, take_result(-7, EIO));
+  EXPECT_EQ(EIO, errno);
+  EXPECT_TRUE(out.untouched());
+  EXPECT_THAT(traced(), IsEmpty());
+}
+
+TEST_F(NodeLiveness, OfAPlatformWithoutMonitorsFails) {
+  scripted_cluster().has_monitors = false;
+  EVMONNodeLivenessHandler absent(path);
+  Monitored_Client::forget_traces();
+  errno = 77;
+  EXPECT_EQ(Hb_Failure, absent.handler(&out.events, out.name, out.group.get(), &out.sequence));
+  EXPECT_EQ(77, errno);
+  EXPECT_TRUE(out.untouched());
+  EXPECT_THAT(numbers_of(11), ElementsAre(minus_one, 77, minus_one));
+}
+
+TEST_F(NodeLiveness, WithNothingToReadIsTheEventNone) {
+  scripted_cluster().wake(descriptor());
+  errno = 77;
+  EXPECT_EQ(Hb_Success, take());
+  EXPECT_EQ(77, errno);
+  EXPECT_EQ(0, out.events);
+  out.events = 0x7A;
+  EXPECT_TRUE(out.untouched());
+  EXPECT_THAT(traced(), ElementsAre(Pair(231U, info), Pair(236U, info), Pair(284U, info)));
+  EXPECT_THAT(numbers_of(284), ElementsAre(static_cast<uint64_t>(descriptor()), 2));
+}
+
+TEST_F(NodeLiveness, WithARecordThatIsNoneFailsAsAReadDoes) {
+  EXPECT_EQ(Hb_Failure, take_result(2, 0));
+  EXPECT_EQ(Hb_Failure, take_result(1, 0));
+  EXPECT_EQ(Hb_Failure, take_result(0, 0));
+  EXPECT_TRUE(out.untouched());
+  const std::vector<Recorded_Trace> failed = platform_double().traces_of(11);
+  ASSERT_EQ(3U, failed.size());
+  EXPECT_EQ(2U, failed[0].values[0]);
+  EXPECT_EQ(1U, failed[1].values[0]);
+  EXPECT_EQ(0U, failed[2].values[0]);
+}
+
+TEST_F(NodeLiveness, RecordsWhatWasRead) {
+  down(local_node);
+  EXPECT_THAT(numbers_of(10), ElementsAre(0, local_node, 0x1122334455667788, sequence, 21));
+  EXPECT_THAT(sizes_of(10), ElementsAre(4, 4, 8, 8, 4));
+  EXPECT_EQ(info, platform_double().traces_of(10)[0].category);
+}
+
+TEST_F(NodeLiveness, HandsASplitOnAndYieldsItsResult) {
+  uint32_t nodes[] = {1};
+  zu_evm_event_split_merge_cfg_t split = {};
+  split.event_type = ZU_EVM_SUBCLUSTER_MERGE;
+  split.num_local_node_up = 1;
+  split.local_node_numbers = nodes;
+  Monitored_Client::subscribe();
+  EXPECT_EQ(Hb_Success, take(split));
+  EXPECT_EQ(8192, out.events);
+  hb_free_split_info(&out.group->Hb_membership_grp_union.split_info);
+  split.event_subtype = ZU_EVM_SPLITMERGE_EVENT_SUBTYPE_REMOTE;
+  EXPECT_EQ(Hb_Failure, take(split));
+  EXPECT_EQ(3U, platform_double().traces_of(284).at(1).values.at(1));
+}
+
+// Before a report is looked at.
+
+TEST_F(NodeLiveness, TellsNothingOfThisNode) {
+  Monitored_Client::goes_down(local_node);
+  EXPECT_EQ(Hb_Success, down(local_node));
+  expect_empty_delivery(local_node, low_sequence);
+  EXPECT_EQ(0U, scripted_cluster().times_asked("zu_vex_get_node_info_after_event"));
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of(local_node).first);
+}
+
+TEST_F(NodeLiveness, TellsNothingWhileTheInterfacesCannotBeListed) {
+  Monitored_Client::goes_down(3);
+  platform_double().net_intf_info.answers.push_back({-1, nullptr});
+  EXPECT_EQ(Hb_Success, down(3));
+  expect_empty_delivery(3, 0);
+  EXPECT_EQ(0U, scripted_cluster().times_asked("zu_vex_get_node_info_after_event"));
+}
+
+TEST_F(NodeLiveness, FailsAsTheBuildOfTheTableDoes) {
+  Monitored_Client::goes_down(3);
+  platform_double().node_info_after_event.answers.push_back({-1, nullptr});
+  EXPECT_EQ(Hb_Failure, down(3));
+  EXPECT_TRUE(out.untouched());
+  EXPECT_THAT(Monitored_Client::queue(), IsEmpty());
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of(3).first);
+  EXPECT_THAT(numbers_of(284), ElementsAre(static_cast<uint64_t>(descriptor()), 3));
+}
+
+TEST_F(NodeLiveness, AsksForTheNodesAsTheReportLeavesThem) {
+  int category = -1;
+  uint32_t node = 0;
+  scripted_cluster().at_query_after_event = [&](const zu_evm_event_metadata_t* event) {
+    category = event->category;
+    node = event->event.p_node_liveness->node_number;
+    Monitored_Client::goes_down(3);
+  };
+  EXPECT_EQ(Hb_Success, down(3));
+  EXPECT_EQ(0, category);
+  EXPECT_EQ(3U, node);
+  EXPECT_EQ(1, out.group->Hb_events);
+}
+
+// Down.
+
+TEST_F(NodeLiveness, ADeathThatIsNoneIsStale) {
+  EXPECT_EQ(Hb_Success, down(3));
+  expect_nothing_told(0);
+  EXPECT_TRUE(is_group_untouched());
+  EXPECT_THAT(numbers_of(168), ElementsAre(0, 3, 0x1122334455667788, sequence, 21));
+  EXPECT_EQ(info, platform_double().traces_of(168)[0].category);
+}
+
+TEST_F(NodeLiveness, ADeathThatIsKnownIsRepeated) {
+  Monitored_Client::goes_down(3);
+  Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
+  EXPECT_EQ(Hb_Success, down(3));
+  expect_empty_delivery(3, low_sequence);
+  EXPECT_THAT(numbers_of(267), ElementsAre(0, 3, 2, 6));
+}
+
+TEST_F(NodeLiveness, ADeathTellsTheAdaptersAtOnceAndQueuesTheNode) {
+  Monitored_Client::subscribe();
+  Monitored_Client::goes_down(3);
+  EXPECT_EQ(Hb_Success, down(3));
+  EXPECT_EQ(1, out.events);
+  EXPECT_EQ("adapters", name());
+  EXPECT_EQ(0U, out.sequence);
+  EXPECT_EQ(Hb_Adapter_Group, out.group->Hb_group_type);
+  EXPECT_EQ(1, out.group->Hb_events);
+  EXPECT_EQ(2, count_of(*out.group));
+  EXPECT_THAT(adapters_of(*out.group), ElementsAre(adapter(3, 0), adapter(3, 1)));
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(Queued_Event{1, {3}, 1}, configuration_event));
+  EXPECT_EQ(1, client.bytes_in_pipe());
+  EXPECT_EQ(1U, times_traced(78));
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(3, 0));
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(3, 1));
+}
+
+TEST_F(NodeLiveness, ADeathLeavesTheTableInForceUntilItsConfigurationIsTaken) {
+  Monitored_Client::goes_down(3, ZU_VEX_NODE_DOWN_REASON_STOPPED);
+  down(3);
+  EXPECT_THAT(Monitored_Client::state_of(3), Pair(Hb_Entity_Up, Hb_Entity_State_Reason_Up));
+  Monitored_Client::take_configuration();
+  EXPECT_THAT(Monitored_Client::state_of(3), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_STOPPED_Down));
+}
+
+TEST_F(NodeLiveness, AStaleInterfaceOfADeadNodeDoesNotComeBackWithTheTable) {
+  Monitored_Client::goes_down(3);
+  Monitored_Client::interface(3, 0).status = ZU_VEX_INTF_STATUS_STALE;
+  down(3);
+  Monitored_Client::take_configuration();
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(3, 0));
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of_adapter(2, 0));
+}
+
+TEST_F(NodeLiveness, WithoutASubscriptionToNetworksADeadNodesAdaptersAreNoEvent) {
+  Monitored_Client::goes_down(3);
+  EXPECT_EQ(Hb_Success, down(3));
+  EXPECT_EQ(0, out.events);
+  EXPECT_EQ("<EMPTY EVENT>", name());
+  EXPECT_EQ(1U, times_traced(192));
+  EXPECT_THAT(adapters_of(*out.group), ElementsAre(adapter(3, 0), adapter(3, 1)));
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(Queued_Event{1, {3}, 1}, configuration_event));
+}
+
+TEST_F(NodeLiveness, ADeathWithoutAdaptersIsToldAtOnce) {
+  Monitored_Client::subscribe();
+  Monitored_Client::goes_down(3, ZU_VEX_NODE_DOWN_REASON_SHUTDOWN);
+  Monitored_Client::mark_adapters(3, Hb_Entity_Down);
+  EXPECT_EQ(Hb_Success, down(3));
+  EXPECT_EQ(1, out.events);
+  EXPECT_EQ("nodes", name());
+  EXPECT_EQ(low_sequence, out.sequence);
+  expect_node_in_group(3, 1);
+  EXPECT_THAT(Monitored_Client::state_of(3), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_SHUT_Down));
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
+  EXPECT_EQ(1, client.bytes_in_pipe());
+  EXPECT_EQ(0U, times_traced(78));
+}
+
+TEST_F(NodeLiveness, WithoutASubscriptionToNodesADeathKeepsItsCode) {
+  Monitored_Client::goes_down(3);
+  Monitored_Client::mark_adapters(3, Hb_Entity_Down);
+  EXPECT_EQ(Hb_Success, down(3));
+  EXPECT_EQ(1, out.events);
+  EXPECT_EQ("<EMPTY EVENT>", name());
+}
+
+TEST_F(NodeLiveness, OfANodeThatLeftTheConfigurationTheReasonStays) {
+  Monitored_Client::mark_node(4, Hb_Entity_Up, Hb_Entity_State_Reason_BRIXD_Up);
+  Monitored_Client::mark_adapters(4, Hb_Entity_Down);
+  scripted_cluster().nodes.pop_back();
+  EXPECT_EQ(Hb_Success, down(4));
+  EXPECT_EQ(1, out.events);
+  EXPECT_THAT(Monitored_Client::state_of(4), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_BRIXD_Up));
+  Monitored_Client::take_configuration();
+  EXPECT_FALSE(Monitored_Client::is_configured(4));
+}
+
+TEST_F(NodeLiveness, ADeathOfANodeThatWasNotConfiguredIsTold) {
+  Monitored_Client::add_node(5, ZU_VEX_NODE_STATUS_DOWN);
+  EXPECT_EQ(Hb_Success, down(5));
+  EXPECT_EQ(1, out.events);
+  expect_node_in_group(5, 1);
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
+  EXPECT_FALSE(Monitored_Client::is_configured(5));
+}
+
+TEST_F(NodeLiveness, OfANodeWhoseDaemonWasDownOnlyTheAdaptersAreTold) {
+  Monitored_Client::subscribe();
+  Monitored_Client::mark_node(3, Hb_Entity_Down, Hb_Entity_State_Reason_BRIXD_Down);
+  Monitored_Client::goes_down(3);
+  EXPECT_EQ(Hb_Success, down(3));
+  EXPECT_EQ(1, out.events);
+  EXPECT_EQ("adapters", name());
+  EXPECT_THAT(adapters_of(*out.group), ElementsAre(adapter(3, 0), adapter(3, 1)));
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
+}
+
+TEST_F(NodeLiveness, OfANodeWhoseDaemonWasDownWithoutAdaptersTheTableIsTold) {
+  Monitored_Client::subscribe();
+  Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_BRIXD_Down);
+  Monitored_Client::goes_down(3);
+  EXPECT_EQ(Hb_Success, down(3));
+  EXPECT_EQ(128, out.events);
+  EXPECT_EQ("Hb_Config_Group", name());
+  EXPECT_THAT(Monitored_Client::queue(), IsEmpty());
+  EXPECT_EQ(0, client.bytes_in_pipe());
+  EXPECT_THAT(Monitored_Client::state_of(3), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_Down));
+  EXPECT_EQ(0, global_config_tbl_new.Hb_num_nodes);
+}
+
+// Up.
+
+TEST_F(NodeLiveness, AReturnThatIsNoneIsStale) {
+  Monitored_Client::goes_down(3);
+  EXPECT_EQ(Hb_Success, up(3));
+  expect_nothing_told(0);
+  EXPECT_TRUE(is_group_untouched());
+  EXPECT_THAT(numbers_of(174), ElementsAre(1, 3, 0x1122334455667788, sequence, 21));
+}
+
+TEST_F(NodeLiveness, AReturnThatIsKnownIsRepeated) {
+  EXPECT_EQ(Hb_Success, up(3));
+  expect_empty_delivery(3, low_sequence);
+  EXPECT_THAT(numbers_of(267), ElementsAre(1, 3, 1, 1));
+}
+
+TEST_F(NodeLiveness, AReturnTellsTheNodeAtOnceAndQueuesTheConfigurationBeforeTheAdapters) {
+  Monitored_Client::subscribe();
+  Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
+  EXPECT_EQ(Hb_Success, up(3));
+  EXPECT_EQ(2, out.events);
+  EXPECT_EQ("nodes", name());
+  EXPECT_EQ(low_sequence, out.sequence);
+  expect_node_in_group(3, 2);
+  EXPECT_THAT(Monitored_Client::queue(),
+              ElementsAre(configuration_event, Queued_Event{2, {adapter(3, 0), adapter(3, 1)}, 2}));
+  EXPECT_EQ(1, client.bytes_in_pipe());
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of(3).first);
+}
+
+TEST_F(NodeLiveness, EveryOtherTypeOfReportIsAReturn) {
+  Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
+  EXPECT_EQ(Hb_Success, take(report(static_cast<zu_evm_event_type_t>(77), 3)));
+  EXPECT_EQ(2, out.events);
+}
+
+TEST_F(NodeLiveness, AReturnLeavesTheRebuiltTableToTheConfigurationEvent) {
+  Monitored_Client::add_node(5);
+  EXPECT_EQ(Hb_Success, up(5));
+  EXPECT_EQ(2, out.events);
+  expect_node_in_group(5, 2);
+  EXPECT_FALSE(Monitored_Client::is_configured(5));
+  Monitored_Client::take_configuration();
+  EXPECT_TRUE(Monitored_Client::is_configured(5));
+}
+
+TEST_F(NodeLiveness, AReturnWithoutAnAnswerAboutAdaptersIsToldAlone) {
+  Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
+  platform_double().net_intf_info.answers = {{0, nullptr, 0, true}, {-1, nullptr}};
+  EXPECT_EQ(Hb_Success, up(3));
+  EXPECT_EQ(2, out.events);
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
+}
+
+// The pipe.
+
+TEST_F(NodeLiveness, FailsWhenTheCallerCannotBeWokenAndKeepsTheEvents) {
+  Monitored_Client::goes_down(3);
+  client.remove_event_pipe();
+  EXPECT_EQ(Hb_Failure, down(3));
+  EXPECT_EQ(90, hb_get_errno());
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(Queued_Event{1, {3}, 1}, configuration_event));
+  Monitored_Client::drop_queue();
+  Monitored_Client::mark(2, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
+  EXPECT_EQ(Hb_Failure, up(2));
+  EXPECT_EQ(2U, Monitored_Client::queue().size());
+}
+
+// Numbers beyond what a cluster has.
+
+class StrangeNodes : public NodeLiveness, public testing::WithParamInterface<uint32_t> {};
+
+TEST_P(StrangeNodes, DieWithoutAMemberAndWithoutHarm) {
+  EXPECT_EQ(Hb_Success, down(GetParam()));
+  EXPECT_EQ(1, out.events);
+  EXPECT_THAT(nodes_of(*out.group), IsEmpty());
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
+  for (uint32_t node = 1; node <= 4; ++node) EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of_adapter(node, 0));
+}
+
+TEST_P(StrangeNodes, ReturnWithoutAMemberAndWithoutHarm) {
+  EXPECT_EQ(Hb_Success, up(GetParam()));
+  EXPECT_EQ(2, out.events);
+  EXPECT_THAT(nodes_of(*out.group), IsEmpty());
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
+}
+
+INSTANTIATE_TEST_SUITE_P(Numbers, StrangeNodes, testing::Values(2049U, 65537U, 0x80000001U, minus_one));
+
+}  // namespace
+}  // namespace hb_test
