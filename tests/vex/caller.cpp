@@ -126,7 +126,7 @@ bool Caller::take_one() {
   event.result = hb_get_event_message(ready.data(), nullptr, &event.events, name, &group(), &event.sequence);
   event.error = hb_get_errno();
   event.name = name;
-  if (event.result == Hb_Success) apply(event);
+  if (event.result == Hb_Success || event.error == HB_EEVENTPIPE) apply(event);
   taken.push_back(event);
   return true;
 }

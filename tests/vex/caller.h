@@ -27,7 +27,7 @@ struct Known_Adapter {
 
 std::string hexadecimal(const void* bytes, size_t size);
 
-// What one call of hb_get_event_message() told.
+// What one call of hb_get_event_message() told. It tells something, too, when only waking the caller again failed.
 struct Taken_Event {
   Hb_Rc result = Hb_Failure;
   int error = 0;  // the error number afterwards
