@@ -1,8 +1,6 @@
 #include "VEX_migration.h"
 
 #include <algorithm>
-#include <memory>
-#include <new>
 
 #include "VEX_EVMONAdapterEventHandler.h"
 #include "VEX_HBC_trace.h"
@@ -111,18 +109,13 @@ void hb_migrate_construct_global_table_and_events() {
     return;
   }
   trace(Trace_Info, trace_vex_start);
-  // What the driver would deliver at once goes to the queue without a notification; these are for nobody.
-  const std::unique_ptr<Hb_Group> group(new (std::nothrow) Hb_Group);
-  if (group == nullptr) {
-    set_hb_errno(HB_EMIGRATE_EVENTS);
-    return;
-  }
+  // Without a notification nothing is delivered at once: these are for nobody, and a group is not filled.
   Hb_Events events = HB_EVENT_NONE;
   Hb_Name name = {};
   Hb_Seq_Num sequence = 0;
   zu_vex_net_intf_info_t* interfaces = nullptr;
   hb_refresh_boot_ip_addrs(&interfaces);
   // The interfaces are dropped, not released.
-  adapter_event_handler_p->update_global_table_and_construct_events(&events, name, group.get(), &sequence, nullptr,
+  adapter_event_handler_p->update_global_table_and_construct_events(&events, name, nullptr, &sequence, nullptr,
                                                                     interfaces);
 }

@@ -1,7 +1,10 @@
 // The monitor of nodes: what it tells of a node that went down or came up.
 #include "VEX_EVMONNodeLivenessHandler.h"
 
+#include <functional>
+
 #include "monitored_cluster.h"
+#include "support/allocation_faults.h"
 
 namespace hb_test {
 namespace {
@@ -359,6 +362,83 @@ TEST_F(NodeLiveness, FailsWhenTheCallerCannotBeWokenAndKeepsTheEvents) {
   Monitored_Client::mark(2, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
   EXPECT_EQ(Hb_Failure, up(2));
   EXPECT_EQ(2U, Monitored_Client::queue().size());
+}
+
+// Memory.
+
+long blocks_of_a_list() {
+  const LeakAllowed list_stays;
+  const long before = live_allocations();
+  zu_vex_net_intf_info_t* list = nullptr;
+  EXPECT_EQ(Hb_Success, hb_get_new_net_intf_info(&list));
+  zu_vex_free_net_intf_info(list);
+  return live_allocations() - before;
+}
+
+TEST_F(NodeLiveness, OfAReportOneListOfBootInterfacesStaysAndNothingElse) {
+  Monitored_Client::trace_nothing();
+  const size_t handed_out = Scripted_Cluster::outstanding();
+  const long blocks = blocks_of_a_list();
+  EXPECT_LT(0, blocks);
+  const auto stays = [&](Hb_Rc rc, long before) {
+    EXPECT_EQ(Hb_Success, rc);
+    Monitored_Client::drop_queue();
+    empty_global_config_table(&global_config_tbl_new);
+    EXPECT_EQ(blocks, live_allocations() - before);
+    EXPECT_EQ(handed_out, Scripted_Cluster::outstanding());
+  };
+  const std::function<void()> situations[] = {
+      [] { Monitored_Client::mark(3, Hb_Entity_Up, Hb_Entity_State_Reason_Up); },
+      [] { Monitored_Client::mark_adapters(3, Hb_Entity_Down); },
+      [] { Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_BRIXD_Down); },
+      [] { Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down); },
+  };
+  for (const auto& situation : situations) {
+    Monitored_Client::goes_down(3);
+    situation();
+    long before = live_allocations();
+    stays(down(3), before);
+    Monitored_Client::comes_up(3);
+    before = live_allocations();
+    stays(up(3), before);
+  }
+}
+
+TEST(NodeLivenessMemory, ThatRunsOutFailsTheReportOrLeavesAnEventUntoldAndNothingThrows) {
+  char path[] = "monitor";
+  for (const zu_evm_event_type_t type : {ZU_EVM_EVENT_DOWN, ZU_EVM_EVENT_UP}) {
+    bool happened = true;
+    size_t failures = 0;
+    for (size_t nth = 1; happened; ++nth) {
+      Monitored_Client client;
+      ASSERT_TRUE(client.started);
+      Monitored_Client::trace_nothing();
+      EVMONNodeLivenessHandler monitor(path);
+      EventOutputs out;
+      if (type == ZU_EVM_EVENT_DOWN) {
+        Monitored_Client::goes_down(3);
+      } else {
+        Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
+      }
+      scripted_cluster().notify(monitor.getFileDescriptor(), zu_evm_event_node_liveness_t{type, 3, 1, 2, 3, {}});
+      Hb_Rc rc = Hb_Success;
+      {
+        const LeakAllowed lists_stay;
+        const AllocationFailure failure(nth);
+        rc = monitor.handler(&out.events, out.name, out.group.get(), &out.sequence);
+        happened = failure.happened();
+      }
+      if (rc == Hb_Failure) {
+        ++failures;
+        EXPECT_TRUE(happened);
+        EXPECT_TRUE(out.untouched()) << nth;
+        EXPECT_THAT(Monitored_Client::queue(), IsEmpty()) << nth;
+        EXPECT_EQ(type == ZU_EVM_EVENT_UP ? Hb_Entity_Down : Hb_Entity_Up, Monitored_Client::state_of(3).first);
+      }
+      EXPECT_EQ(0U, Scripted_Cluster::outstanding(Platform_Handout::node_liveness));
+    }
+    EXPECT_LT(5U, failures);
+  }
 }
 
 // Numbers beyond what a cluster has.
