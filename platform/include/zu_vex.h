@@ -151,7 +151,7 @@ int zu_vex_get_net_intf_info_after_event(const struct zu_evm_event_metadata_t* e
 /** The addresses that the nodes start with. */
 int zu_vex_get_boot_addrs(zu_vex_net_intf_info_t** list);
 
-/* Each releases a record or a whole list with everything in it; null is nothing. */
+/* Each releases a record or a whole list with everything in it; null is nothing. None is a point of cancellation. */
 void zu_vex_free_cluster_info(zu_vex_cluster_info_t* info);
 void zu_vex_free_node_info(zu_vex_node_info_t* list);
 void zu_vex_free_net_intf_info(zu_vex_net_intf_info_t* list);
