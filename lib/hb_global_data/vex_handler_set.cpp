@@ -81,9 +81,6 @@ Monitor monitors[] = {
     {"/var/ha/evmon/peer_gs_liveness", open_monitor<peer_GS_liveness_handler_p>},
 };
 
-char event_pipe_label[] = "event pipe";
-char new_group_pipe_label[] = "new-group pipe";
-
 bool never_waits(int descriptor) { return fcntl(descriptor, F_SETFL, O_NONBLOCK) == 0; }
 
 class Pipe {
@@ -104,8 +101,8 @@ class Pipe {
 
   // A handler that owns both ends from then on.
   template <typename Handler>
-  std::unique_ptr<Handler> hand_over(char* label) {
-    std::unique_ptr<Handler> handler(new (std::nothrow) Handler(ends_, label));
+  std::unique_ptr<Handler> hand_over() {
+    std::unique_ptr<Handler> handler(new (std::nothrow) Handler(ends_, nullptr));
     is_open_ = is_open_ && handler == nullptr;
     return handler;
   }
@@ -121,7 +118,7 @@ bool make_event_pipe() {
   }
   Pipe pipe;
   return pipe.is_open() && never_waits(pipe.read_end()) && never_waits(pipe.write_end()) &&
-         keep(event_pipe_handler_p, pipe.hand_over<EVMONEventPipeHandler>(event_pipe_label)) == Creation::made;
+         keep(event_pipe_handler_p, pipe.hand_over<EVMONEventPipeHandler>()) == Creation::made;
 }
 
 bool make_new_group_pipe() {
@@ -130,8 +127,7 @@ bool make_new_group_pipe() {
   }
   Pipe pipe;
   return pipe.is_open() && never_waits(pipe.write_end()) &&
-         keep(new_group_event_handler_p, pipe.hand_over<EVMONNewGroupEventHandler>(new_group_pipe_label)) ==
-             Creation::made;
+         keep(new_group_event_handler_p, pipe.hand_over<EVMONNewGroupEventHandler>()) == Creation::made;
 }
 
 struct Release_Cluster_Info {

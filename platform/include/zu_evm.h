@@ -288,7 +288,9 @@ enum {
  * @param init_string what to write to it first; may be null.
  * @param descriptor receives a descriptor that becomes readable with each notification. It belongs to the caller, who
  *   closes it.
- * @return 0, or another value with `errno` set.
+ * @return 0; -1 when there are no monitors here; or any other value, with `errno` set, when this one could not be
+ *   opened. Of the first monitor that a client opens -1 means that it does without any of them; of every other one it
+ *   is a failure as well.
  */
 int zu_evm_open(const char* path, const char* init_string, int* descriptor);
 
