@@ -6,6 +6,18 @@
 #include "monitored_cluster.h"
 #include "support/allocation_faults.h"
 
+namespace {
+
+bool node_events_can_be_made = true;
+
+}  // namespace
+
+extern "C" Hb_VEX_Event* __real__Z13VEX_new_event13Hb_Group_Type(Hb_Group_Type type);
+extern "C" Hb_VEX_Event* __wrap__Z13VEX_new_event13Hb_Group_Type(Hb_Group_Type type);
+Hb_VEX_Event* __wrap__Z13VEX_new_event13Hb_Group_Type(Hb_Group_Type type) {
+  return type == Hb_Node_Group && !node_events_can_be_made ? nullptr : __real__Z13VEX_new_event13Hb_Group_Type(type);
+}
+
 namespace hb_test {
 namespace {
 
@@ -100,6 +112,13 @@ TEST_F(NodeLiveness, WithARecordThatIsNoneFailsAsAReadDoes) {
   EXPECT_EQ(2U, failed[0].values[0]);
   EXPECT_EQ(1U, failed[1].values[0]);
   EXPECT_EQ(0U, failed[2].values[0]);
+}
+
+TEST_F(NodeLiveness, IsArmedWithNothing) {
+  const Platform_Question& opened = scripted_cluster().asked.back();
+  EXPECT_EQ("zu_evm_open", std::string(opened.call));
+  EXPECT_EQ("monitor", std::string(opened.path.c_str()));
+  EXPECT_EQ("", std::string(opened.init_string.c_str()));
 }
 
 TEST_F(NodeLiveness, RecordsWhatWasRead) {
@@ -200,6 +219,17 @@ TEST_F(NodeLiveness, ADeathTellsTheAdaptersAtOnceAndQueuesTheNode) {
   EXPECT_EQ(1U, times_traced(78));
   EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(3, 0));
   EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(3, 1));
+}
+
+TEST_F(NodeLiveness, ADeathWhoseEventCannotBeMadeIsTracedAndTheRestIsTold) {
+  Monitored_Client::subscribe();
+  Monitored_Client::goes_down(3);
+  node_events_can_be_made = false;
+  EXPECT_EQ(Hb_Success, down(3));
+  node_events_can_be_made = true;
+  EXPECT_EQ(1U, times_traced(86));
+  EXPECT_EQ(1, out.events);
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
 }
 
 TEST_F(NodeLiveness, ADeathLeavesTheTableInForceUntilItsConfigurationIsTaken) {
