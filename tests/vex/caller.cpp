@@ -105,11 +105,11 @@ void Caller::read_configuration() {
   keep_only(adapters_up, configured_adapters);
 }
 
-std::vector<int> Caller::readable() const {
+std::vector<int> Caller::readable(int milliseconds) const {
   std::vector<pollfd> polled;
   for (int i = 0; i < descriptor_count_; ++i) polled.push_back({descriptors_[i], POLLIN, 0});
   std::vector<int> ready;
-  if (poll(polled.data(), polled.size(), 0) > 0) {
+  if (poll(polled.data(), polled.size(), milliseconds) > 0) {
     for (const pollfd& one : polled) {
       if (one.revents != 0) ready.push_back(one.fd);
     }
@@ -117,9 +117,14 @@ std::vector<int> Caller::readable() const {
   return ready;
 }
 
-bool Caller::take_one() {
-  std::vector<int> ready = readable();
-  if (ready.empty()) return false;
+bool Caller::take_one() { return take_from(readable(0)); }
+
+void Caller::wait_and_take_one() { take_from(readable(-1)); }
+
+bool Caller::take_from(std::vector<int> ready) {
+  if (ready.empty()) {
+    return false;
+  }
   ready.push_back(-1);
   Taken_Event event;
   Hb_Name name = "";

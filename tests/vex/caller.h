@@ -50,8 +50,12 @@ class Caller {
   // Opens the monitors, subscribes to nodes, adapters and splits, and reads the configuration.
   Hb_Rc start();
 
-  // Asks for the descriptors alone.
-  Hb_Rc follow();
+  // The steps of a start behind the opening of the monitors, which a client of the daemon takes as well.
+  Hb_Rc subscribe();
+  Hb_Rc follow();  // asks for the descriptors
+
+  // Waits until something is readable, and takes one event.
+  void wait_and_take_one();
 
   // Polls without waiting. When something is readable it takes one event and returns true.
   bool take_one();
@@ -76,8 +80,8 @@ class Caller {
   std::string split_subscription = "splits";
 
  private:
-  Hb_Rc subscribe();
-  std::vector<int> readable() const;
+  std::vector<int> readable(int milliseconds) const;
+  bool take_from(std::vector<int> ready);
   void apply(Taken_Event& event);
   void apply_nodes(Taken_Event& event);
   void apply_adapters(Taken_Event& event);
