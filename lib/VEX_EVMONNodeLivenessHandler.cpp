@@ -4,6 +4,7 @@
 #include <memory>
 #include <utility>
 
+#include "VEX_untold_changes.h"
 #include "hb_communication/vex_table_build.h"
 #include "vex_outputs.h"
 #include "vex_platform_records.h"
@@ -74,6 +75,7 @@ Hb_Rc Node_Change::tell() {
   if (rc != Hb_Success) {
     return rc;
   }
+  hold_back_changes_of_others(global_config_tbl_new, report_.node_number);
   new_ = node_of(global_config_tbl_new, report_.node_number);
   return report_.event_type == ZU_EVM_EVENT_DOWN ? went_down() : came_up();
 }

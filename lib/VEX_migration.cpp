@@ -57,7 +57,7 @@ Hb_Rc stop_preparing() {
 }  // namespace
 
 Hb_Rc VEX_find_tbl1_node_in_tbl2(Hb_Configuration_Internal* _tbl1, Hb_Configuration_Internal* _tbl2) {
-  const int count = _tbl1->node_list != nullptr ? std::min<int>(_tbl1->Hb_num_nodes, HB_MAX_NODES) : 0;
+  const int count = nodes_in_list(*_tbl1);
   for (int index = 0; index < count; ++index) {
     const int32_t node = _tbl1->node_list[index].node_num;
     if (Hash_search(static_cast<uint32_t>(node), _tbl2->node_hash) == nullptr) {

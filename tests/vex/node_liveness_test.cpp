@@ -380,6 +380,62 @@ TEST_F(NodeLiveness, AReturnWithoutAnAnswerAboutAdaptersIsToldAlone) {
   EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
 }
 
+// Others.
+
+TEST_F(NodeLiveness, OfTwoNodesThatDieAtOnceEachIsToldByItsOwnReport) {
+  Monitored_Client::subscribe();
+  Monitored_Client::goes_down(3);
+  Monitored_Client::goes_down(4);
+  down(3);
+  Monitored_Client::drop_queue();
+  Monitored_Client::take_configuration();
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of(3).first);
+  EXPECT_THAT(Monitored_Client::state_of(4), Pair(Hb_Entity_Up, Hb_Entity_State_Reason_Up));
+  EXPECT_EQ(Hb_Success, down(4));
+  EXPECT_EQ(1, out.events);
+  EXPECT_THAT(adapters_of(*out.group), ElementsAre(adapter(4, 0), adapter(4, 1)));
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(Queued_Event{1, {4}, 1}, configuration_event));
+  Monitored_Client::take_configuration();
+  EXPECT_THAT(Monitored_Client::state_of(4), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down));
+}
+
+TEST_F(NodeLiveness, OfTwoNodesThatReturnAtOnceEachIsToldByItsOwnReport) {
+  Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
+  Monitored_Client::mark(4, Hb_Entity_Down, Hb_Entity_State_Reason_BRIXD_Down);
+  up(3);
+  Monitored_Client::drop_queue();
+  Monitored_Client::take_configuration();
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of(3).first);
+  EXPECT_THAT(Monitored_Client::state_of(4), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_BRIXD_Down));
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(4, 1));
+  Monitored_Client::mark_node(4, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
+  EXPECT_EQ(Hb_Success, up(4));
+  EXPECT_EQ(2, out.events);
+  EXPECT_THAT(Monitored_Client::queue(),
+              ElementsAre(configuration_event, Queued_Event{2, {adapter(4, 0), adapter(4, 1)}, 2}));
+}
+
+TEST_F(NodeLiveness, ANodeThatIsNewWithTheReportOfAnotherIsDownUntilItsOwn) {
+  Monitored_Client::add_node(5);
+  Monitored_Client::goes_down(3);
+  down(3);
+  Monitored_Client::drop_queue();
+  Monitored_Client::take_configuration();
+  EXPECT_THAT(Monitored_Client::state_of(5), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_Down));
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(5, 0));
+  EXPECT_EQ(Hb_Success, up(5));
+  EXPECT_EQ(2, out.events);
+  expect_node_in_group(5, 2);
+}
+
+TEST_F(NodeLiveness, AnInterfaceOfAnotherNodeKeepsItsStateUntilItsOwnNotification) {
+  Monitored_Client::goes_down(3);
+  Monitored_Client::interface(2, 1).status = ZU_VEX_INTF_STATUS_DOWN;
+  down(3);
+  Monitored_Client::take_configuration();
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of_adapter(2, 1));
+}
+
 // The pipe.
 
 TEST_F(NodeLiveness, FailsWhenTheCallerCannotBeWokenAndKeepsTheEvents) {
