@@ -373,6 +373,81 @@ def scenarios():
     return inputs
 
 
+def vex_days():
+    """Steps of targets/vex_notifications.cpp: changes, notifications, calls, taking one or everything."""
+    down, up, split, merge = 0, 1, 14, 15
+    add, delete, address_add, address_delete = 2, 3, 4, 5
+    take_one, take_all = bytes([4]), bytes([5])
+
+    def node_status(index, status, reason=0):
+        return bytes([0, 0, index, status, reason])
+
+    def interface_status(index, status):
+        return bytes([0, 1, index, status & 0xFF])
+
+    def new_node(number):
+        return bytes([0, 2, number])
+
+    def new_interface(node, name=0, address=9):
+        return bytes([0, 3, node, name, address])
+
+    def interface_gone(index):
+        return bytes([0, 4, index])
+
+    def node_gone(index):
+        return bytes([0, 5, index])
+
+    def node_report(kind, node):
+        return bytes([1, 0, kind, node])
+
+    def interface_report(kind, node, name=0):
+        return bytes([1, 1, kind, node, name, 1])
+
+    def address_report(kind, node, name=0, address=9):
+        return bytes([1, 2, kind, node, name, 1, address])
+
+    def split_report(kind, local, remote, subtype=0, own_monitor=1):
+        lists = b"".join(bytes([len(part)]) + bytes(part).ljust(8, b"\0") for part in (local, remote))
+        return bytes([1, 3, kind, subtype]) + lists + bytes([own_monitor])
+
+    def result(monitor, value):
+        return bytes([1, 4, monitor, value & 0xFF])
+
+    def other_report(kind):
+        return bytes([1, kind, 2, 0] + ([1, 0] if kind in (8, 9) else []))
+
+    def call(number, *arguments):
+        return bytes([3, number, *arguments])
+
+    death = node_status(2, 0, 2) + interface_status(4, 0) + interface_status(5, 0) + node_report(down, 3)
+    back = node_status(2, 1) + interface_status(4, 1) + interface_status(5, 1) + node_report(up, 3)
+    return {
+        "death-and-return": death + take_all + back + take_all,
+        "death-that-waits": death + take_one + call(1) + take_one + back + take_all,
+        "stale-and-repeated": node_report(down, 3) + node_report(up, 3) + take_all + death * 2 + take_all,
+        "stale-interfaces": node_status(2, 0) + interface_status(4, 2) + node_report(down, 3) + take_all + call(1),
+        "unknown-status": interface_status(1, 77) + interface_status(2, -1) + call(1) + take_all,
+        "interface": interface_status(3, 0) + interface_report(down, 2, 1) + take_all + interface_report(up, 2, 1),
+        "interface-comes-and-goes": interface_gone(3) + interface_report(delete, 2, 1) + take_all
+        + new_interface(2, 1, 128) + interface_report(add, 2, 1) + take_all,
+        "alias": new_interface(2) + address_report(address_add, 2) + take_one + interface_report(add, 2, 2)
+        + take_all + address_report(address_delete, 2) + take_all,
+        "new-node": new_node(7) + new_interface(7) + other_report(5) + node_report(up, 7) + take_all + node_gone(5)
+        + node_report(down, 7) + take_all,
+        "node-beyond": new_node(0xF3) + new_interface(0xF8, 4) + node_report(up, 0xF5) + call(1) + take_all,
+        "split-and-merge": split_report(split, [1, 2], [3, 4, 5]) + take_all + split_report(merge, [1, 2], [3, 4, 5])
+        + take_all + back + take_all,
+        "split-with-foreign-lists": split_report(split, [0xF8], [0xF3, 3, 3]) + split_report(split, [1], [2], 1)
+        + split_report(split, [1], [2], 0, 8) + take_all,
+        "daemon": death + take_all + call(4, 3) + back + take_all + call(0, 3) + call(0, 2) + call(0, 7) + take_all,
+        "subscriptions": call(3, 0) + call(3, 1) + call(3, 2) + death + take_all + call(2) + take_all,
+        "foreign-bytes": call(5, 0, 9) + call(5, 1, 9) + call(5, 1, 2) + take_all,
+        "failed-queries": b"".join(call(6, which, 0xFF) + death + take_all + back + take_all for which in range(6)),
+        "results": b"".join(result(monitor, value) for monitor in range(8) for value in (0, 1, 2, -1, -16)) + take_all,
+        "others": b"".join(other_report(kind) for kind in (5, 6, 7, 8, 9)) + take_all,
+    }
+
+
 CORPORA = {
     "adapter_event": lambda: with_hostile(adapter_events(), cursor=5),
     "awaited_reply": exchanges,
@@ -401,6 +476,7 @@ CORPORA = {
     "typed_key": keys,
     "unawaited_kind": lambda: with_hostile(answers()),
     "unconfigure_reply": lambda: steering_replies(CONFIG_ADAPTER),
+    "vex_notifications": vex_days,
 }
 
 
