@@ -197,6 +197,25 @@ TEST_F(ClusterLife, ReportsThatPileUpAreTakenOneByOne) {
   expect_true_picture();
 }
 
+TEST_F(ClusterLife, WhatHappensAtOnceIsToldWithoutALoss) {
+  start();
+  life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE);
+  life->node_dies(3, ZU_VEX_NODE_DOWN_REASON_LINK_DOWN);
+  life->interface_dies(4, "en1");
+  life->remove_boot_address(5, 0);
+  take();
+  expect_true_picture();
+  life->node_returns(3);
+  life->node_dies(6, ZU_VEX_NODE_DOWN_REASON_NONE);
+  life->interface_returns(4, "en1");
+  life->node_returns(2);
+  take();
+  expect_true_picture();
+  life->add_boot_address(5, 0);
+  take();
+  expect_true_picture();
+}
+
 TEST_F(ClusterLife, WithoutSubscriptionsOnlyTheConfigurationIsFollowed) {
   life.emplace(8);
   IsVEX = Hb_True;
