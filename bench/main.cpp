@@ -51,6 +51,7 @@ int main(int argc, char** argv) {
   bench::add_steering_rows();
   bench::add_route_rows();
   bench::add_notification_rows();
+  bench::add_vex_rows();
   bench::add_memory_rows();
 #ifdef HB_BENCH_DAEMON
   bench::add_daemon_rows();

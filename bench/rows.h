@@ -37,6 +37,7 @@ void add_request_rows();
 void add_steering_rows();
 void add_route_rows();
 void add_notification_rows();
+void add_vex_rows();
 void add_memory_rows();
 void add_daemon_rows();
 void add_daemon_memory_rows();
