@@ -246,7 +246,8 @@ void add_adapters(Configuration_Parts& parts, int count, const zu_vex_net_intf_i
   parts.by_address.reset(Hash_init("Hb_IP list", prime(2 * count)));
   Adapter_Slots slots;
   Hb_Adapter* next = parts.adapters.get();
-  for (const zu_vex_net_intf_info_t* each = list; each != nullptr; each = each->p_next) {
+  const Hb_Adapter* end = next + count;
+  for (const zu_vex_net_intf_info_t* each = list; each != nullptr && next != end; each = each->p_next) {
     const Hb_Adapter_Number number = slots.take(each->node_number);
     if (number != HB_NO_ADAPTER) {
       Hb_Adapter& adapter = *next++;
