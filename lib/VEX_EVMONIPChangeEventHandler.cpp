@@ -21,36 +21,37 @@ void trace_notification(Notification& notification) {
               block_of_interface(notification.p_interface_name), block_of_text(address)});
 }
 
-enum class Kind { change, alias, repeated };
+// What a table says of the address.
+enum class Place { nowhere, down, up };
 
-Kind kind_of(bool is_repeated, bool is_in_a_table, bool is_boot_address) {
-  if (!is_in_a_table && !is_boot_address) {
-    return Kind::alias;
-  }
-  return is_repeated ? Kind::repeated : Kind::change;
-}
-
-bool is_in(const Hb_Configuration_Internal& table, const Notification& notification) {
+Place place_in(const Hb_Configuration_Internal& table, const Notification& notification) {
   zu_vex_net_intf_info_t interface = {};
   interface.node_number = notification.node_number;
   interface.p_name = notification.p_interface_name;
   interface.ip_addr = notification.ip_addr;
-  return find_adapter_of_interface(table, interface) != nullptr;
+  const Hb_Adapter* adapter = find_adapter_of_interface(table, interface);
+  if (adapter == nullptr) {
+    return Place::nowhere;
+  }
+  return adapter->Hb_state == Hb_Entity_Up ? Place::up : Place::down;
 }
 
+enum class Kind { change, alias, repeated };
+
 Kind kind_of(Notification& notification) {
-  const bool is_now = is_in(global_config_tbl, notification);
-  const bool will_be = is_in(table_about_to_take_effect(), notification);
-  const bool is_boot =
-      is_boot_interface(notification.node_number, notification.p_interface_name, &notification.ip_addr);
-  switch (notification.event_type) {
-    case ZU_EVM_ADDRESS_ADD:
-      return kind_of(is_now && will_be, is_now || will_be, is_boot);
-    case ZU_EVM_ADDRESS_DELETE:
-      return kind_of(!is_now && !will_be, is_now || will_be, is_boot);
-    default:
-      return Kind::change;
+  const Place now = place_in(global_config_tbl, notification);
+  const Place soon = place_in(table_about_to_take_effect(), notification);
+  const bool is_in_no_table = now == Place::nowhere && soon == Place::nowhere;
+  const bool came = notification.event_type == ZU_EVM_ADDRESS_ADD;
+  if (!came && notification.event_type != ZU_EVM_ADDRESS_DELETE) {
+    return Kind::change;
   }
+  if (is_in_no_table &&
+      !is_boot_interface(notification.node_number, notification.p_interface_name, &notification.ip_addr)) {
+    return Kind::alias;
+  }
+  const bool is_repeated = came ? now == Place::up && soon == Place::up : is_in_no_table;
+  return is_repeated ? Kind::repeated : Kind::change;
 }
 
 Hb_Rc tell_change(EVMONConfigurationHandler& handler, Notification& notification, const Vex_Outputs& out) {

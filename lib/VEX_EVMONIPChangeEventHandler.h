@@ -1,7 +1,8 @@
 // The monitor of interface addresses.
 //
 // What a notification does:
-// - An address that came and is in the tables already, or went and is in none, is a repeated one: the empty event.
+// - An address that came and is up in the tables already, or went and is in none, is a repeated one: the empty event.
+//   (One that is in a table, and down, may have got there by the report of a node; its join is still to be told.)
 // - One that came or went otherwise, and is neither a boot address nor in a table, is told as an alias: the event code
 //   is all that is written.
 // - Everything else is a change: the table is rebuilt, and the differences are told. When the interfaces cannot be

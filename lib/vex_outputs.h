@@ -3,10 +3,8 @@
 
 #include <cstring>
 
+#include "event_names.h"
 #include "hb_client/events.h"
-
-inline constexpr char empty_event_name[] = "<EMPTY EVENT>";
-inline constexpr char configuration_event_name[] = "Hb_Config_Group";
 
 struct Vex_Outputs {
   Hb_Events* events;

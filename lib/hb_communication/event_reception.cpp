@@ -5,6 +5,7 @@
 
 #include "VEX_EVMONEventPipeHandler.h"
 #include "VEX_HBC_trace.h"
+#include "event_names.h"
 #include "hb_communication/configuration_load.h"
 #include "hb_communication/connection.h"
 #include "hb_global_data/record_index.h"
@@ -13,9 +14,6 @@
 Hb_client_hb_info_t client_hb_info = {};
 
 namespace {
-
-constexpr char configuration_event_name[] = "Hb_Config_Group";
-constexpr char ffdc_event_name[] = "Hb_FFDC_Group";
 
 // The caller's outputs of one event.
 struct Outputs {

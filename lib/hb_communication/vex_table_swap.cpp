@@ -12,7 +12,7 @@ namespace {
 
 // Whether the table was built since it was emptied.
 bool is_built(const Hb_Configuration_Internal& table) {
-  return table.node_list != nullptr || table.Hb_global_adapter_list != nullptr;
+  return table.node_list != nullptr || table.Hb_global_adapter_list != nullptr || table.Hb_max_nodes != 0;
 }
 
 // Throws std::bad_alloc, as the next does.

@@ -137,6 +137,21 @@ TEST_F(IPChange, AnAddressThatIsKnownAndComesIsRepeated) {
   expect_empty_event();
 }
 
+TEST_F(IPChange, AnAddressThatIsInTheTableAndDownComesWithItsJoin) {
+  Monitored_Client::find(3, 1)->Hb_state = Hb_Entity_Down;
+  EXPECT_EQ(Hb_Success, added(3, en1, known));
+  EXPECT_EQ(128, out.events);
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(Queued_Event{2, {adapter(3, 1)}, 1}));
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::find(3, 1)->Hb_state);
+}
+
+TEST_F(IPChange, AnAddressThatIsDownInTheWaitingTableAloneIsAChange) {
+  scripted_cluster().interfaces[5].status = ZU_VEX_INTF_STATUS_DOWN;
+  ASSERT_EQ(Hb_Success, hb_vex_update_global_tbl(&global_config_tbl_new, nullptr, &global_config_tbl, nullptr));
+  EXPECT_EQ(Hb_Success, added(3, en1, known));
+  EXPECT_EQ(1U, times_traced(233));
+}
+
 TEST_F(IPChange, AnAliasAddressThatComesIsTheAliasEventAlone) {
   EXPECT_EQ(Hb_Success, added(3, en1, alias));
   expect_alias_alone();

@@ -156,6 +156,19 @@ TEST_F(TableSwap, WithoutANewTableLeavesTheOneInForce) {
   EXPECT_EQ(find_configured_adapter(48), &global_config_tbl.Hb_global_adapter_list[0]);
 }
 
+TEST_F(TableSwap, PutsANewTableWithoutMembersInForce) {
+  empty_global_config_table(&global_config_tbl_new);
+  global_config_tbl_new.Hb_max_nodes = 2049;
+  global_config_tbl_new.local_node_number = 7;
+  VEX_copy_and_delete_global_config_tbl();
+  EXPECT_EQ(global_config_tbl.local_node_number, 7);
+  EXPECT_EQ(global_config_tbl.Hb_max_nodes, 2049);
+  EXPECT_EQ(global_config_tbl.Hb_num_nodes, 0);
+  EXPECT_EQ(global_config_tbl.Hb_num_adapters, 0);
+  EXPECT_EQ(find_configured_adapter(48), nullptr);
+  EXPECT_EQ(global_config_tbl_new.Hb_max_nodes, 0);
+}
+
 TEST_F(TableSwap, WithoutMemoryLeavesBothTables) {
   trace_nothing();
   size_t failures = 0;
