@@ -20,6 +20,7 @@ using testing::IsEmpty;
 class ScriptedCluster : public testing::Test {
  protected:
   ScriptedCluster() {
+    platform_double().reset();
     cluster.local_node = 3;
     cluster.nodes = {{3}, {5, ZU_VEX_NODE_STATUS_DOWN, ZU_VEX_NODE_DOWN_REASON_STOPPED, std::nullopt}};
     cluster.interfaces = {{3, "en0", scripted_address(0, 0, 3)}, {5, "en1", scripted_address(0, 0, 5)}};
