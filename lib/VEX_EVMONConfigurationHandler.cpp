@@ -5,6 +5,7 @@
 #include "VEX_HBC_trace.h"
 #include "VEX_migration.h"
 #include "hb_communication/vex_table_build.h"
+#include "table_comparison.h"
 #include "vex_outputs.h"
 
 namespace {
@@ -28,8 +29,8 @@ Hb_Rc find_changes(EVMONHandler& handler, Changes& changes) {
   Hb_VEX_Event* config = nullptr;
   Hb_VEX_Event* adapter_join = nullptr;
   Hb_VEX_Event* node_join = nullptr;
-  const Hb_Rc rc = handler.compare_global_config_tables(&global_config_tbl_new, &adapter_death, &node_death, &config,
-                                                        &adapter_join, &node_join);
+  const Hb_Rc rc = tell_table_changes(handler, global_config_tbl_new,
+                                      {&adapter_death, &node_death, &config, &adapter_join, &node_join});
   changes.adapter_death.reset(adapter_death);
   changes.node_death.reset(node_death);
   changes.config.reset(config);

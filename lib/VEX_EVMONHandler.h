@@ -82,17 +82,17 @@ class EVMONHandler {
   void copy_site_split_Hb_Group(Hb_Group* source, Hb_Group* destination);
   void copy_site_merge_Hb_Group(Hb_Group* source, Hb_Group* destination);
 
-  // What changed from the table in force to a new one, as one event of each kind. Each fails when there is no memory
-  // for an event; those that were made are still the caller's.
-  Hb_Rc compare_global_config_tables(Hb_Configuration_Internal* new_table, Hb_VEX_Event** adapter_death,
-                                     Hb_VEX_Event** node_death, Hb_VEX_Event** config, Hb_VEX_Event** adapter_join,
-                                     Hb_VEX_Event** node_join);
-  Hb_Rc generate_event_for_missing_tbl2_adapters(Hb_Configuration_Internal* table1, Hb_Configuration_Internal* table2,
-                                                 zu_int32_t kind, Hb_VEX_Event** event);
-  Hb_Rc generate_event_for_missing_tbl2_node(Hb_Configuration_Internal* table1, Hb_Configuration_Internal* table2,
-                                             zu_int32_t kind, Hb_VEX_Event** event);
-  Hb_Rc generate_event_for_config_change(Hb_Configuration_Internal* table1, Hb_Configuration_Internal* table2,
-                                         Hb_VEX_Event** event);
+  // What changed from the table in force to a new one, as one event of each kind. Without memory for an event its
+  // pointer stays null.
+  void compare_global_config_tables(Hb_Configuration_Internal* new_table, Hb_VEX_Event** adapter_death,
+                                    Hb_VEX_Event** node_death, Hb_VEX_Event** config, Hb_VEX_Event** adapter_join,
+                                    Hb_VEX_Event** node_join);
+  void generate_event_for_missing_tbl2_adapters(Hb_Configuration_Internal* table1, Hb_Configuration_Internal* table2,
+                                                zu_int32_t kind, Hb_VEX_Event** event);
+  void generate_event_for_missing_tbl2_node(Hb_Configuration_Internal* table1, Hb_Configuration_Internal* table2,
+                                            zu_int32_t kind, Hb_VEX_Event** event);
+  void generate_event_for_config_change(Hb_Configuration_Internal* table1, Hb_Configuration_Internal* table2,
+                                        Hb_VEX_Event** event);
 
   // The registry. Slots are only appended: one that was emptied stays empty. The array is never freed.
   static int32_t numbersOfFileDescriptors;  // live ones

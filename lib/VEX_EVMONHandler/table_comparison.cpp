@@ -1,7 +1,8 @@
+#include "table_comparison.h"
+
 #include <algorithm>
 #include <cstring>
 
-#include "VEX_EVMONHandler.h"
 #include "VEX_HBC_trace.h"
 #include "VEX_migration.h"
 #include "chain_index.h"
@@ -155,23 +156,25 @@ void trace_cluster_differences(Hb_Configuration_Internal& table1, Hb_Configurati
 
 }  // namespace
 
-Hb_Rc EVMONHandler::generate_event_for_missing_tbl2_adapters(Hb_Configuration_Internal* table1,
-                                                             Hb_Configuration_Internal* table2, zu_int32_t kind,
-                                                             Hb_VEX_Event** event) {
+Hb_Rc tell_lost_adapters(EVMONHandler& handler, const Hb_Configuration_Internal& table1,
+                         const Hb_Configuration_Internal& table2, zu_int32_t kind, Hb_VEX_Event** event,
+                         zu_int32_t left_out) {
   if (event == nullptr) {
     trace(Trace_Errors, trace_no_adapter_event_pointer);
     return Hb_Success;
   }
   *event = nullptr;
   zu_int32_t count = 0;
-  const Adapter_Index other = counterparts_in(*table2);
-  const int adapters = adapters_in_list(*table1);
+  const Adapter_Index other(counterparts_in(table2));
+  const int adapters = adapters_in_list(table1);
   for (int record = 0; record < adapters; ++record) {
-    const Hb_Adapter& adapter = table1->Hb_global_adapter_list[record];
-    if (!is_lost(adapter, node_of(*table1, adapter), other)) {
+    const Hb_Adapter& adapter = table1.Hb_global_adapter_list[record];
+    const uint32_t node = node_of(table1, adapter);
+    if (node == static_cast<uint32_t>(left_out) || !is_lost(adapter, node, other) ||
+        adapter.Hb_adapter_num >= HB_MAX_ADAPTERS) {
       continue;
     }
-    construct_an_adapter_event(event, kind, adapter.Hb_adapter_num);
+    handler.construct_an_adapter_event(event, kind, adapter.Hb_adapter_num);
     if (*event == nullptr) {
       return Hb_Failure;
     }
@@ -183,17 +186,18 @@ Hb_Rc EVMONHandler::generate_event_for_missing_tbl2_adapters(Hb_Configuration_In
   return Hb_Success;
 }
 
-Hb_Rc EVMONHandler::generate_event_for_missing_tbl2_node(Hb_Configuration_Internal* table1,
-                                                         Hb_Configuration_Internal* table2, zu_int32_t kind,
-                                                         Hb_VEX_Event** event) {
+Hb_Rc tell_lost_nodes(EVMONHandler& handler, const Hb_Configuration_Internal& table1,
+                      const Hb_Configuration_Internal& table2, zu_int32_t kind, Hb_VEX_Event** event,
+                      zu_int32_t left_out) {
   zu_int32_t count = 0;
-  const int nodes = nodes_in_list(*table1);
+  const int nodes = nodes_in_list(table1);
   for (int record = 0; record < nodes; ++record) {
-    const Hb_Node_config_state& node = table1->node_list[record];
-    if (!is_lost(node, table2->node_hash, kind)) {
+    const Hb_Node_config_state& node = table1.node_list[record];
+    if (node.node_num == left_out || !is_lost(node, table2.node_hash, kind) || node.node_num < 0 ||
+        node.node_num >= HB_MAX_NODES) {
       continue;
     }
-    constructNodeEvent(node.node_num, event, kind);
+    handler.constructNodeEvent(node.node_num, event, kind);
     if (event != nullptr && *event == nullptr) {
       return Hb_Failure;
     }
@@ -205,32 +209,53 @@ Hb_Rc EVMONHandler::generate_event_for_missing_tbl2_node(Hb_Configuration_Intern
   return Hb_Success;
 }
 
-Hb_Rc EVMONHandler::generate_event_for_config_change(Hb_Configuration_Internal* table1,
-                                                     Hb_Configuration_Internal* table2, Hb_VEX_Event** event) {
-  trace_cluster_differences(*table1, *table2);
-  if (!counts_differ(*table1, *table2) && !an_adapter_differs(*table1, *table2)) {
+Hb_Rc tell_configuration_change(EVMONHandler& handler, Hb_Configuration_Internal& table1,
+                                Hb_Configuration_Internal& table2, Hb_VEX_Event** event) {
+  trace_cluster_differences(table1, table2);
+  if (!counts_differ(table1, table2) && !an_adapter_differs(table1, table2)) {
     return Hb_Success;
   }
-  constructConfigEvent(event);
+  handler.constructConfigEvent(event);
   return event == nullptr || *event != nullptr ? Hb_Success : Hb_Failure;
 }
 
-Hb_Rc EVMONHandler::compare_global_config_tables(Hb_Configuration_Internal* new_table, Hb_VEX_Event** adapter_death,
-                                                 Hb_VEX_Event** node_death, Hb_VEX_Event** config,
-                                                 Hb_VEX_Event** adapter_join, Hb_VEX_Event** node_join) {
-  Hb_Configuration_Internal* present = &global_config_tbl;
+Hb_Rc tell_table_changes(EVMONHandler& handler, Hb_Configuration_Internal& new_table, const Comparison_Events& events) {
+  Hb_Configuration_Internal& present = global_config_tbl;
   bool whole = true;
   trace(Trace_Info, trace_comparing_gone_adapters);
-  whole &= generate_event_for_missing_tbl2_adapters(present, new_table, HB_EVENT_DEATH, adapter_death) == Hb_Success;
+  whole &= tell_lost_adapters(handler, present, new_table, HB_EVENT_DEATH, events.adapter_death) == Hb_Success;
   trace(Trace_Info, trace_comparing_gone_nodes);
-  whole &= generate_event_for_missing_tbl2_node(present, new_table, HB_EVENT_DEATH, node_death) == Hb_Success;
+  whole &= tell_lost_nodes(handler, present, new_table, HB_EVENT_DEATH, events.node_death) == Hb_Success;
   if (migrate_to_vex_prep) {
-    whole &= generate_event_for_config_change(present, new_table, config) == Hb_Success;
-    whole &= generate_event_for_config_change(new_table, present, config) == Hb_Success;
+    whole &= tell_configuration_change(handler, present, new_table, events.config) == Hb_Success;
+    whole &= tell_configuration_change(handler, new_table, present, events.config) == Hb_Success;
   }
   trace(Trace_Info, trace_comparing_new_adapters);
-  whole &= generate_event_for_missing_tbl2_adapters(new_table, present, HB_EVENT_JOIN, adapter_join) == Hb_Success;
+  whole &= tell_lost_adapters(handler, new_table, present, HB_EVENT_JOIN, events.adapter_join) == Hb_Success;
   trace(Trace_Info, trace_comparing_new_nodes);
-  whole &= generate_event_for_missing_tbl2_node(new_table, present, HB_EVENT_JOIN, node_join) == Hb_Success;
+  whole &= tell_lost_nodes(handler, new_table, present, HB_EVENT_JOIN, events.node_join) == Hb_Success;
   return whole ? Hb_Success : Hb_Failure;
+}
+
+void EVMONHandler::generate_event_for_missing_tbl2_adapters(Hb_Configuration_Internal* table1,
+                                                            Hb_Configuration_Internal* table2, zu_int32_t kind,
+                                                            Hb_VEX_Event** event) {
+  tell_lost_adapters(*this, *table1, *table2, kind, event);
+}
+
+void EVMONHandler::generate_event_for_missing_tbl2_node(Hb_Configuration_Internal* table1,
+                                                        Hb_Configuration_Internal* table2, zu_int32_t kind,
+                                                        Hb_VEX_Event** event) {
+  tell_lost_nodes(*this, *table1, *table2, kind, event);
+}
+
+void EVMONHandler::generate_event_for_config_change(Hb_Configuration_Internal* table1,
+                                                    Hb_Configuration_Internal* table2, Hb_VEX_Event** event) {
+  tell_configuration_change(*this, *table1, *table2, event);
+}
+
+void EVMONHandler::compare_global_config_tables(Hb_Configuration_Internal* new_table, Hb_VEX_Event** adapter_death,
+                                                Hb_VEX_Event** node_death, Hb_VEX_Event** config,
+                                                Hb_VEX_Event** adapter_join, Hb_VEX_Event** node_join) {
+  tell_table_changes(*this, *new_table, {adapter_death, node_death, config, adapter_join, node_join});
 }
