@@ -4,6 +4,7 @@
 
 #include "VEX_HBC_trace.h"
 #include "VEX_migration.h"
+#include "hb_communication/vex_set_aside_table.h"
 #include "hb_communication/vex_table_build.h"
 #include "table_comparison.h"
 #include "vex_outputs.h"
@@ -105,6 +106,9 @@ void tell(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool 
   const bool takes_effect = !migrate_to_vex_prep && !changes.has_deaths();
   if (migrate_to_vex_prep) {
     append(std::move(changes.adapter_death));
+    if (at_once) {
+      deliver_no_event(out, 0);
+    }
   } else {
     deliver_first(handler, changes, out, at_once);
   }
@@ -120,6 +124,7 @@ void tell(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool 
 Hb_Rc update(EVMONHandler& handler, const Vex_Outputs& out, zu_evm_event_metadata_t* metadata,
              zu_vex_net_intf_info_t* interfaces) {
   hb_vex_dump_global_table(&global_config_tbl, "Update global table: old table");
+  Set_Aside_Table older;
   Hb_Rc rc = hb_vex_update_global_tbl(&global_config_tbl_new, metadata, &global_config_tbl, interfaces);
   if (rc != Hb_Success) {
     return rc;
@@ -131,6 +136,7 @@ Hb_Rc update(EVMONHandler& handler, const Vex_Outputs& out, zu_evm_event_metadat
     if (rc != Hb_Success) {
       return rc;
     }
+    older.keep_new_table();
     tell(handler, changes, out, metadata != nullptr);
   }
   return VEX_write_to_event_pipe();

@@ -1,9 +1,11 @@
 // Base of the handlers whose notifications may change the configuration.
 //
 // What the interface leaves open:
+// - While a client prepares to move, or after it gave that up, everything is queued; a notification that is read then
+//   delivers the empty event.
 // - When only nodes died, no death is delivered at once, and the caller gets the empty event.
-// - Without memory for one of the events nothing is told, and the table in force stays: the next notification finds the
-//   same differences again.
+// - Without memory for one of the events nothing is told, the table in force stays, and so does an older new table that
+//   waits for its configuration event: the next notification finds the same differences again.
 #pragma once
 
 #include "VEX_EVMONHandler.h"

@@ -14,8 +14,6 @@
 
 namespace {
 
-constexpr unsigned char wake_up = 1;
-
 void read_wake_up(int descriptor) {
   unsigned char byte = 0;
   const ssize_t result = read(descriptor, &byte, sizeof byte);
@@ -23,7 +21,7 @@ void read_wake_up(int descriptor) {
     trace_values(Trace_Info, trace_event_pipe_read_failed, result, errno);
   } else if (result == 0) {
     trace(Trace_Info, trace_event_pipe_at_end);
-  } else if (byte != wake_up) {
+  } else if (byte != VEX_wake_up) {
     set_hb_errno(HB_EPIPEMSG);
     trace_values(Trace_Info, trace_event_pipe_message, byte, result, HB_EPIPEMSG);
   }
@@ -99,9 +97,12 @@ void deliver_group(EVMONHandler& handler, const Delivery& delivery, Hb_Group& fr
   delivery.copy(handler, &from, out.group);
 }
 
+// An event before this one may have put the new table in force.
 void deliver_configuration(const Vex_Outputs& out) {
   trace(Trace_Info, trace_delivering_configuration);
-  VEX_copy_and_delete_global_config_tbl();
+  if (is_table_built(global_config_tbl_new)) {
+    VEX_copy_and_delete_global_config_tbl();
+  }
   hb_vex_dump_global_table(&global_config_tbl, "Event pipe handler: after copy");
   put_name(out.name, configuration_event_name);
 }
@@ -130,6 +131,8 @@ EVMONEventPipeHandler::EVMONEventPipeHandler(int32_t* fds, char* path)
 
 EVMONEventPipeHandler::EVMONEventPipeHandler(char* path)
     : EVMONHandler(path, static_cast<const char*>(nullptr)), evmon_pipe_write_fd(-1) {}
+
+int32_t EVMONEventPipeHandler::getWriteFd() { return evmon_pipe_write_fd; }
 
 EVMONEventPipeHandler::~EVMONEventPipeHandler() {
   if (evmon_pipe_write_fd != -1) {

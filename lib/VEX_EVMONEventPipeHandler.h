@@ -13,8 +13,8 @@ class EVMONEventPipeHandler : public EVMONHandler {
   // Takes one event from the queue, whether or not a byte waits, and delivers it; then wakes the caller for the next.
   // A new configuration takes effect here, in the caller's thread.
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
-  int32_t getWriteFd() { return evmon_pipe_write_fd; }
+  int32_t getWriteFd();
 
- private:
+ protected:
   int32_t evmon_pipe_write_fd;
 };

@@ -4,9 +4,9 @@
 // What the interface leaves open:
 // - A handler that memory has no place for in the registry is left without a descriptor; one whose path cannot be kept
 //   is as one whose monitor could not be opened, with `ENOMEM` as result and error. A pipe needs no path.
-// - When two handlers have the same descriptor, because somebody closed it behind the library's back and the system
-//   handed it out again, the registry stays free of handlers that are gone: leaving empties the first slot of the
-//   descriptor, and the other handler keeps the second.
+// - Two handlers may have the same descriptor, when somebody closed it behind the library's back and the system handed
+//   it out again. Leaving empties the first slot of the descriptor, whoever's it is. A handler that is destroyed then
+//   leaves its own slot to the one that lost it, and no slot keeps it, however often it registered.
 // - A number of a node or an adapter that the lists have no place for is left out; the others count.
 // - The adapters that come with a joining node are those that the cluster services report up and that the configuration
 //   knows, by node, name and address. They are named by their numbers in the table that is about to take effect, as
@@ -33,6 +33,9 @@ typedef FDHandlerArray HandlerInstancesMap;
 // What the list of adapters of an event has for an adapter that the event is about.
 inline constexpr Hb_Incarnation VEX_named_in_group = 0;
 
+// What opening a monitor yields where there are none.
+inline constexpr int VEX_monitors_are_absent = -1;
+
 // In the place of a node's number: no node is named.
 inline constexpr zu_int32_t VEX_no_node = -1;
 
@@ -47,9 +50,9 @@ class EVMONHandler {
   // Reads what the descriptor delivers and fills the caller's outputs, or queues events. Never called on a base object.
   virtual Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p);
 
-  int getFileDescriptor() { return evmon_fd; }
-  int getOpenFileError() { return open_file_errno; }
-  int getVEXEVMOpenRCInConstructor() { return vex_open_file_rc; }
+  int getFileDescriptor();
+  int getOpenFileError();
+  int getVEXEVMOpenRCInConstructor();
 
   // All registered descriptors and a -1, in a new array of the caller's.
   static int* getFileDescriptors();
@@ -100,12 +103,13 @@ class EVMONHandler {
   static int32_t currentSlots;              // ever used
   static HandlerInstancesMap* handlerInstances;
 
-  // While it is set, a monitor that cannot be opened as there are none at all (-1) is no error to be traced.
+  // While it is set, a monitor that cannot be opened as there are none at all is no error to be traced.
   static bool absence_is_no_error;
 
  private:
   int32_t open_and_register(char* fname, const char* p_initstr);
   void drop_descriptor();
+  void leave_slots_to(HandlerInstancesMap emptied);
 
  protected:
   int32_t evmon_fd;

@@ -8,11 +8,9 @@
 #include "VEX_HBC_trace.h"
 #include "platform_membership.h"
 #include "vex_outputs.h"
+#include "vex_platform_records.h"
 
 namespace {
-
-constexpr unsigned char node_group = 1;
-constexpr unsigned char adapter_group = 2;
 
 bool is_member(const Hb_Boolean& entry) { return entry == Hb_True; }
 bool is_member(const Hb_Incarnation& entry) { return entry == VEX_named_in_group; }
@@ -58,7 +56,7 @@ Hb_Rc answer_with_nodes(EVMONHandler& handler, const Vex_Outputs& out) {
     trace_values(Trace_Info, trace_new_group_nodes_failed, result, HB_EVEXTBL_ENTRY);
     return fail(HB_EVEXTBL_ENTRY);
   }
-  const Platform_Nodes nodes(list);
+  const Node_List nodes(list);
   *out.events = HB_EVENT_NEW_GROUP;
   *out.seqnum = 0;
   handler.fillInNodeEventInfo(VEX_no_node, HB_EVENT_NEW_GROUP, out.name, out.group);
@@ -88,7 +86,7 @@ Hb_Rc answer_with_adapters(EVMONHandler& handler, const Vex_Outputs& out) {
     trace_values(Trace_Info, trace_new_group_adapters_failed, result, errno, HB_EVEXTBL_INTF);
     return fail(HB_EVEXTBL_INTF);
   }
-  const Platform_Interfaces interfaces(list);
+  const Interface_List interfaces(list);
   *out.events = HB_EVENT_NEW_GROUP;
   handler.fillInOneAdapterEvent(out.events, out.name, out.group, out.seqnum);
   if (out.group != nullptr) {
@@ -100,9 +98,9 @@ Hb_Rc answer_with_adapters(EVMONHandler& handler, const Vex_Outputs& out) {
 
 Hb_Rc answer(EVMONHandler& handler, unsigned char request, ssize_t count, const Vex_Outputs& out) {
   switch (request) {
-    case node_group:
+    case VEX_ask_for_node_group:
       return answer_with_nodes(handler, out);
-    case adapter_group:
+    case VEX_ask_for_adapter_group:
       return answer_with_adapters(handler, out);
     default:
       trace_values(Trace_Info, trace_new_group_unknown, request, count, HB_EVEXGROUP);
@@ -133,6 +131,8 @@ EVMONNewGroupEventHandler::EVMONNewGroupEventHandler(int32_t* fds, char* path)
 
 EVMONNewGroupEventHandler::EVMONNewGroupEventHandler(char* path)
     : EVMONHandler(path, static_cast<const char*>(nullptr)), evmon_pipe_write_fd(-1) {}
+
+int32_t EVMONNewGroupEventHandler::getWriteFd() { return evmon_pipe_write_fd; }
 
 EVMONNewGroupEventHandler::~EVMONNewGroupEventHandler() {
   if (evmon_pipe_write_fd != -1) {

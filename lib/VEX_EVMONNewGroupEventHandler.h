@@ -11,6 +11,10 @@
 
 #include "VEX_EVMONHandler.h"
 
+// What a subscription writes into the pipe.
+inline constexpr char VEX_ask_for_node_group = 1;
+inline constexpr char VEX_ask_for_adapter_group = 2;
+
 class EVMONNewGroupEventHandler : public EVMONHandler {
  public:
   EVMONNewGroupEventHandler(int32_t* fds, char* path);  // fds: read end, write end; both are taken over
@@ -19,8 +23,8 @@ class EVMONNewGroupEventHandler : public EVMONHandler {
 
   // Answers one request with the present group. It waits for a request when the read end does.
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
-  int32_t getWriteFd() { return evmon_pipe_write_fd; }
+  int32_t getWriteFd();
 
- private:
+ protected:
   int32_t evmon_pipe_write_fd;
 };

@@ -1,5 +1,6 @@
-// Records of a list by a hash of their key, without walking the list. Candidates for a key come in the order of the
-// list. Without memory every record is a candidate for every key: what is found stays the same.
+// Records of a list by a hash of their key, without walking the list. Candidates for a key come in the reverse of the
+// order in which they were put in, which matters only to who wants the first of several. Without memory every record is
+// a candidate for every key, in the order of their numbers.
 #pragma once
 
 #include <bit>
@@ -23,7 +24,7 @@ class Chain_Index {
     }
   }
 
-  // Records are put in from the last one of the list to its first.
+  // Who wants the first of the list puts in the last one first; everybody else in any order.
   void put(uint32_t record, uint32_t hash) {
     if (heads_ != nullptr) {
       next_[record] = heads_[hash & mask_];

@@ -43,6 +43,39 @@ inline int nodes_in_list(const Hb_Configuration_Internal& table) {
   return table.node_list != nullptr ? std::clamp<int>(table.Hb_num_nodes, 0, HB_MAX_NODES) : 0;
 }
 
+// An adapter's number says whose it is.
+inline bool is_adapter_of(const Hb_Configuration_Internal& table, const Hb_Adapter& adapter, uint32_t node) {
+  return node < HB_MAX_NODES && table.Hb_adapters_per_node > 0 &&
+         adapter.Hb_adapter_num / static_cast<uint32_t>(table.Hb_adapters_per_node) == node;
+}
+
+// The first adapter of the node, by its number, that `is_it` holds for, or null. Numbers that no list of adapters has a
+// place for are left out.
+template <typename Is_It>
+Hb_Adapter* find_adapter_of(const Hb_Configuration_Internal& table, uint32_t node, Is_It is_it) {
+  if (node >= HB_MAX_NODES || table.Hb_adapters_per_node <= 0) {
+    return nullptr;
+  }
+  const auto slots = static_cast<uint64_t>(table.Hb_adapters_per_node);
+  const uint64_t end = std::min<uint64_t>((node + uint64_t{1}) * slots, HB_MAX_ADAPTERS);
+  for (uint64_t number = node * slots; number < end; ++number) {
+    auto* adapter = static_cast<Hb_Adapter*>(Hash_search(static_cast<uint32_t>(number), table.adap_hash));
+    if (adapter != nullptr && is_it(*adapter)) {
+      return adapter;
+    }
+  }
+  return nullptr;
+}
+
+// Calls use(adapter) for each of them.
+template <typename Use>
+void for_each_adapter_of(const Hb_Configuration_Internal& table, uint32_t node, Use use) {
+  find_adapter_of(table, node, [&](Hb_Adapter& adapter) {
+    use(adapter);
+    return false;
+  });
+}
+
 inline bool is_node_number(const Hb_Configuration_Internal& table, int node) {
   return node >= 0 && node < table.Hb_max_nodes;
 }

@@ -1,7 +1,5 @@
 #include "hb_subscription.h"
 
-#include <unistd.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
@@ -15,6 +13,7 @@
 #include "hb_global_data/node_table.h"
 #include "member_set.h"
 #include "network_slots.h"
+#include "platform/Pipe.h"
 
 namespace {
 
@@ -210,17 +209,13 @@ Hb_Subscription_Type type_to_send(Hb_Subscription_Type type, int32_t members) {
   return type;
 }
 
-// The byte that asks the new-group monitor for a group.
-constexpr char ask_for_node_group = 1;
-constexpr char ask_for_adapter_group = 2;
-
 Hb_Rc wake_new_group_monitor(char request) {
   if (new_group_event_handler_p == nullptr) {
     trace(Trace_Info, trace_no_new_group_handler);
     return fail(HB_ENOGROUPHANDLER);
   }
   const int descriptor = new_group_event_handler_p->getWriteFd();
-  const ssize_t written = write(descriptor, &request, sizeof request);
+  const ssize_t written = write_to_pipe(descriptor, request);
   if (written != 1) {
     trace_values(Trace_Info, trace_new_group_write_failed, written, errno);
     return fail(HB_EEVENTPIPE);
@@ -236,12 +231,12 @@ Hb_Rc remember_subscription(char* name, Hb_Subscription_Type type) {
     case Hb_Node_Subscription:
     case Hb_All_Nodes_Subscription:
       copy_name(nodeEventSubscriptionName, name);
-      return vex_mode ? wake_new_group_monitor(ask_for_node_group) : Hb_Success;
+      return vex_mode ? wake_new_group_monitor(VEX_ask_for_node_group) : Hb_Success;
     case Hb_Adapter_Subscription:
     case Hb_All_Adapters_Subscription:
     case Hb_Network_Subscription:
       copy_name(networkEventSubscriptionName, name);
-      return vex_mode ? wake_new_group_monitor(ask_for_adapter_group) : Hb_Success;
+      return vex_mode ? wake_new_group_monitor(VEX_ask_for_adapter_group) : Hb_Success;
     case Hb_Site_Subscription:
     case Hb_All_Sites_Subscription:
       copy_name(siteEventSubscriptionName, name);

@@ -3,10 +3,9 @@
 #include <cstring>
 
 #include "hb_global_data/record_index.h"
+#include "vex_platform_records.h"
 
 namespace {
-
-constexpr size_t name_length = 32;  // characters of an interface name that count
 
 bool is_of_node(const Hb_Configuration_Internal& table, const Hb_Adapter& adapter, uint32_t node) {
   return table.Hb_adapters_per_node > 0 &&
@@ -17,7 +16,7 @@ bool is_same(const Hb_Configuration_Internal& table, const Hb_Adapter& adapter,
              const zu_vex_net_intf_info_t& interface) {
   const char* name = interface.p_name != nullptr ? interface.p_name : "";
   return is_of_node(table, adapter, interface.node_number) &&
-         std::strncmp(adapter.Hb_adapter_type, name, name_length) == 0 &&
+         std::strncmp(adapter.Hb_adapter_type, name, interface_name_length) == 0 &&
          std::memcmp(&adapter.Hb_ip_address, &interface.ip_addr, sizeof interface.ip_addr) == 0;
 }
 

@@ -1,17 +1,8 @@
 // Who is up, as the cluster services see it, in terms of a configuration table.
 #pragma once
 
-#include <memory>
-
 #include "configuration_table.h"
 #include "zu_vex.h"
-
-struct Release_Platform_List {
-  void operator()(zu_vex_net_intf_info_t* list) const { zu_vex_free_net_intf_info(list); }
-  void operator()(zu_vex_node_info_t* list) const { zu_vex_free_node_info(list); }
-};
-typedef std::unique_ptr<zu_vex_net_intf_info_t, Release_Platform_List> Platform_Interfaces;
-typedef std::unique_ptr<zu_vex_node_info_t, Release_Platform_List> Platform_Nodes;
 
 // The table's adapter of the interface's node, name and address, or null.
 Hb_Adapter* find_adapter_of_interface(const Hb_Configuration_Internal& table, const zu_vex_net_intf_info_t& interface);

@@ -6,6 +6,7 @@
 #include "hb_communication/event_reception.h"
 #include "platform_membership.h"
 #include "vex_outputs.h"
+#include "vex_platform_records.h"
 
 namespace {
 
@@ -49,30 +50,26 @@ Hb_VEX_Event* new_node_event() {
   return event;
 }
 
-bool is_adapter_of(const Hb_Adapter& adapter, zu_int32_t node, zu_int32_t adapters_per_node) {
-  return adapters_per_node > 0 && node >= 0 &&
-         adapter.Hb_adapter_num / static_cast<uint32_t>(adapters_per_node) == static_cast<uint32_t>(node);
-}
-
 bool is_named(const Hb_VEX_Event* event, Hb_Adapter_Number adapter) {
   return event != nullptr && adapter < HB_MAX_ADAPTERS &&
          event->group.Hb_membership_grp_union.Hb_adapter_membership_grp.Hb_adapter_list[adapter] == VEX_named_in_group;
 }
 
-// Names each adapter once in one event, and counts them.
+// Names adapters in one event, and counts them.
 class Adapter_Event {
  public:
   Adapter_Event(EVMONHandler& handler, Hb_VEX_Event** event, zu_int32_t kind)
       : handler_(handler), event_(event), kind_(kind) {}
 
-  // False when there is no memory for the event.
+  // False when there is no memory for the event, as in the next.
   bool name(Hb_Adapter_Number adapter) {
-    if (event_ != nullptr && is_named(*event_, adapter)) {
-      return true;
-    }
     handler_.construct_an_adapter_event(event_, kind_, adapter);
     ++count_;
     return event_ == nullptr || *event_ != nullptr;
+  }
+
+  bool name_once(Hb_Adapter_Number adapter) {
+    return (event_ != nullptr && is_named(*event_, adapter)) || name(adapter);
   }
 
   zu_int32_t count() const { return count_; }
@@ -86,15 +83,15 @@ class Adapter_Event {
 
 void trace_goes_down(const Hb_Adapter& adapter, zu_int32_t node) {
   trace_data(Trace_Errors, trace_adapter_goes_down,
-             {block_of_text(adapter.Hb_adapter_type), block_of(adapter.Hb_adapter_num), block_of(adapter.Hb_state),
-              block_of(node)});
+             {block_of_name(adapter.Hb_adapter_type, sizeof adapter.Hb_adapter_type), block_of(adapter.Hb_adapter_num),
+              block_of(adapter.Hb_state), block_of(node)});
 }
 
-// The node's adapters that are up are named in the event and go down.
+// The node's adapters that are up are named in the event and go down; each record of the list counts.
 Hb_Rc take_adapters_down(zu_int32_t node, Adapter_Event& event) {
   Hb_Adapter* end = global_config_tbl.Hb_global_adapter_list + adapters_in_list(global_config_tbl);
   for (Hb_Adapter* adapter = global_config_tbl.Hb_global_adapter_list; adapter != end; ++adapter) {
-    if (adapter->Hb_state != Hb_Entity_Up || !is_adapter_of(*adapter, node, global_config_tbl.Hb_adapters_per_node)) {
+    if (adapter->Hb_state != Hb_Entity_Up || !is_adapter_of(global_config_tbl, *adapter, static_cast<uint32_t>(node))) {
       continue;
     }
     trace_goes_down(*adapter, node);
@@ -106,14 +103,15 @@ Hb_Rc take_adapters_down(zu_int32_t node, Adapter_Event& event) {
   return Hb_Success;
 }
 
-// The node's interfaces that are up are named in the event, as far as the configuration knows them.
+// The node's interfaces that are up are named in the event, as far as the configuration knows them. One may be listed
+// several times.
 Hb_Rc bring_adapters_up(zu_int32_t node, Adapter_Event& event, const zu_vex_net_intf_info_t* interfaces) {
   for (const auto* interface = interfaces; interface != nullptr; interface = interface->p_next) {
     if (interface->node_number != static_cast<uint32_t>(node) || interface->status != ZU_VEX_INTF_STATUS_UP) {
       continue;
     }
     const Hb_Adapter* named = find_adapter_of_interface(table_about_to_take_effect(), *interface);
-    if (named != nullptr && !event.name(named->Hb_adapter_num)) {
+    if (named != nullptr && !event.name_once(named->Hb_adapter_num)) {
       return fail(HB_ENOMEM);
     }
     Hb_Adapter* present = find_adapter_of_interface(global_config_tbl, *interface);
@@ -135,7 +133,7 @@ Hb_Rc construct_adapter_join(zu_int32_t node, Adapter_Event& event) {
     trace_values(Trace_Info, trace_join_adapters_failed, result, errno, HB_EVEXTBL_INTF);
     return Hb_Failure;
   }
-  const Platform_Interfaces interfaces(list);
+  const Interface_List interfaces(list);
   return bring_adapters_up(node, event, interfaces.get());
 }
 

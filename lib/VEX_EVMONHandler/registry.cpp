@@ -4,10 +4,10 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
 #include <new>
 
 #include "VEX_HBC_trace.h"
+#include "text_copy.h"
 #include "zu_cu.h"
 #include "zu_evm.h"
 
@@ -21,9 +21,13 @@ namespace {
 
 constexpr int32_t slots_at_once = 10;
 constexpr int step_did_not_run = -1;
-constexpr int monitors_are_absent = -1;
+constexpr HandlerInstancesMap empty_slot = {-1, nullptr};
 
-HandlerInstancesMap* slots_end() { return EVMONHandler::handlerInstances + EVMONHandler::handlerListSlots; }
+// Without an array there are no slots, whatever their number says.
+HandlerInstancesMap* slots_end() {
+  return EVMONHandler::handlerInstances != nullptr ? EVMONHandler::handlerInstances + EVMONHandler::handlerListSlots
+                                                   : nullptr;
+}
 
 // The first slot of the descriptor, or the end.
 HandlerInstancesMap* find_slot(int descriptor) {
@@ -37,13 +41,18 @@ HandlerInstancesMap* copy_of_slots(int32_t capacity) {
   auto* slots = new (std::nothrow) HandlerInstancesMap[static_cast<size_t>(capacity)];
   if (slots != nullptr) {
     auto* rest = std::copy_n(EVMONHandler::handlerInstances, EVMONHandler::currentSlots, slots);
-    std::fill(rest, slots + capacity, HandlerInstancesMap{-1, nullptr});
+    std::fill(rest, slots + capacity, empty_slot);
   }
   return slots;
 }
 
-// Whether there is a slot to append.
+// Whether there is a slot to append. Without an array everything is counted anew.
 bool make_room() {
+  if (EVMONHandler::handlerInstances == nullptr) {
+    EVMONHandler::handlerListSlots = 0;
+    EVMONHandler::currentSlots = 0;
+    EVMONHandler::numbersOfFileDescriptors = 0;
+  }
   if (EVMONHandler::currentSlots < EVMONHandler::handlerListSlots) {
     return true;
   }
@@ -56,15 +65,6 @@ bool make_room() {
   EVMONHandler::handlerInstances = slots;
   EVMONHandler::handlerListSlots = capacity;
   return true;
-}
-
-char* copy_of(const char* text) {
-  const size_t size = std::strlen(text) + 1;
-  auto* copy = new (std::nothrow) char[size];
-  if (copy != nullptr) {
-    std::memcpy(copy, text, size);
-  }
-  return copy;
 }
 
 void trace_not_registered(const char* path, int descriptor) {
@@ -91,14 +91,14 @@ EVMONHandler::EVMONHandler(char* fname, const char* p_initstr)
 
 // The path is kept before the monitor is opened, as nothing may fail behind that.
 int32_t EVMONHandler::open_and_register(char* fname, const char* p_initstr) {
-  evmon_fname = copy_of(fname);
+  evmon_fname = new_copy_of(fname);
   if (evmon_fname == nullptr) {
     errno = ENOMEM;
   }
   const int rc = evmon_fname != nullptr ? zu_evm_open(fname, p_initstr, &evmon_fd) : ENOMEM;
   open_file_errno = errno;
   if (rc != 0 || evmon_fd < 0) {
-    if (rc != monitors_are_absent || !absence_is_no_error) {
+    if (rc != VEX_monitors_are_absent || !absence_is_no_error) {
       trace_data(Trace_Errors, trace_monitor_not_opened,
                  {block_of_text(fname), block_of(rc), block_of(open_file_errno)});
     }
@@ -114,12 +114,15 @@ int32_t EVMONHandler::open_and_register(char* fname, const char* p_initstr) {
 
 EVMONHandler::EVMONHandler(int32_t* /*fds*/, char* path)
     : evmon_fd(-1),
-      evmon_fname(path != nullptr ? copy_of(path) : nullptr),
+      evmon_fname(path != nullptr ? new_copy_of(path) : nullptr),
       vex_open_file_rc(step_did_not_run),
       open_file_errno(0) {}
 
 EVMONHandler::~EVMONHandler() {
+  const HandlerInstancesMap* first = find_slot(evmon_fd);
+  const HandlerInstancesMap emptied = first != slots_end() ? *first : empty_slot;
   selfUnregister();
+  leave_slots_to(emptied);
   drop_descriptor();
   delete[] evmon_fname;
 }
@@ -156,13 +159,7 @@ void EVMONHandler::selfUnregister() {
   if (slot == slots_end()) {
     return;
   }
-  // Where the first slot of the descriptor is another handler's, that one takes the slot of this one.
-  std::for_each(slot, slots_end(), [this, slot](FDHandlerArray& other) {
-    if (other.handler == this) {
-      other.handler = slot->handler;
-    }
-  });
-  *slot = {-1, nullptr};
+  *slot = empty_slot;
   if (numbersOfFileDescriptors < 1) {
     set_hb_errno(HB_ENODESCRIPTORS);
     trace_values(Trace_Errors, trace_none_registered, HB_ENODESCRIPTORS, numbersOfFileDescriptors);
@@ -170,6 +167,26 @@ void EVMONHandler::selfUnregister() {
   }
   --numbersOfFileDescriptors;
 }
+
+// No slot keeps a handler that is gone. The first that does goes to the handler whose slot was emptied in its place, if
+// there is such a one; all others are empty and count no more.
+void EVMONHandler::leave_slots_to(HandlerInstancesMap emptied) {
+  HandlerInstancesMap heir = emptied.handler != this ? emptied : empty_slot;
+  std::for_each(handlerInstances, slots_end(), [this, &heir](FDHandlerArray& slot) {
+    if (slot.handler != this) {
+      return;
+    }
+    slot = heir;
+    if (heir.handler == nullptr && numbersOfFileDescriptors > 0) {
+      --numbersOfFileDescriptors;
+    }
+    heir = empty_slot;
+  });
+}
+
+int EVMONHandler::getFileDescriptor() { return evmon_fd; }
+int EVMONHandler::getOpenFileError() { return open_file_errno; }
+int EVMONHandler::getVEXEVMOpenRCInConstructor() { return vex_open_file_rc; }
 
 int* EVMONHandler::getFileDescriptors() {
   const int32_t limit = std::max(numbersOfFileDescriptors, 0);

@@ -80,6 +80,7 @@ void add_adapter(Configuration_Parts& tables, const hb_configuration_header& hea
 void build(Configuration_Parts& tables, const hb_configuration_header& header, const Message& message) {
   const auto count = static_cast<size_t>(header.num_adapters);
   tables.adapters = std::make_unique_for_overwrite<Hb_Adapter[]>(count);
+  tables.adapter_count = header.num_adapters;
   tables.by_number.reset(Hash_init("Hb_Adapter list", prime(header.num_adapters * 2)));
   tables.nodes_by_number.reset(Hash_init("preVEX_node list", prime(node_table_size)));
   tables.nodes = std::make_unique<Hb_Node_config_state[]>(HB_MAX_NODES);
@@ -93,7 +94,6 @@ void install(Configuration_Parts& tables, const hb_configuration_header& header,
   table.local_node_number = static_cast<Hb_Node_Number>(header.local_node_number);
   table.Hb_max_nodes = header.max_nodes;
   table.Hb_adapters_per_node = header.adapters_per_node;
-  table.Hb_num_adapters = header.num_adapters;
   table.Hb_num_networks = header.num_networks;
   // The periods are not aligned in the header: no reference to them may be made.
   table.Hb_rem_node_down_sim_period = message.at<timeval>(offsetof(hb_configuration_header, rem_node_down_sim_period));

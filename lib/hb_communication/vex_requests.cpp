@@ -1,13 +1,8 @@
-#include <cerrno>
-
-#include "VEX_EVMONAdapterEventHandler.h"
 #include "VEX_EVMONEventPipeHandler.h"
 #include "VEX_HBC_trace.h"
 #include "hb_client/vex.h"
 #include "hb_communication/connection.h"
-#include "hb_communication/vex_table_build.h"
 #include "hb_global_data/start_up.h"
-#include "vex_platform_records.h"
 
 Hb_Rc hb_vex_msg_received_from(Hb_Node_Number node) {
   if (hb_init() != Hb_Success) {
@@ -35,20 +30,4 @@ Hb_Rc hb_vex_delayed_daemon_shutdown() {
   }
   trace(Trace_Info, trace_delayed_shutdown);
   return hb_send(HB_DELAYED_DAEMON_SHUTDOWN, nullptr, 0);
-}
-
-void hb_refresh_boot_ip_addrs_and_update_events() {
-  trace(Trace_Info, trace_refresh_and_update_begins);
-  zu_vex_net_intf_info_t* list = nullptr;
-  hb_refresh_boot_ip_addrs(&list);
-  const Interface_List interfaces(list);
-  if (adapter_event_handler_p != nullptr) {
-    // Without a notification nothing is put into a group.
-    Hb_Events events = HB_EVENT_NONE;
-    Hb_Name name = {};
-    Hb_Seq_Num sequence = 0;
-    adapter_event_handler_p->update_global_table_and_construct_events(&events, name, nullptr, &sequence, nullptr,
-                                                                      interfaces.get());
-  }
-  trace(Trace_Info, trace_refresh_and_update_ends);
 }

@@ -13,12 +13,18 @@
 Hb_Rc hb_vex_update_global_tbl(Hb_Configuration_Internal* cfg_table, zu_evm_event_metadata_t* event_metadata_p,
                                Hb_Configuration_Internal* src_cfg_table, zu_vex_net_intf_info_t* p_src_intf_tbl);
 
-// Moves global_config_tbl_new into global_config_tbl; without a new table, or without memory (HB_EVEXTBL_COPY), the
-// table in force stays.
+// Moves global_config_tbl_new into global_config_tbl, whatever it holds: an empty one empties the table in force.
+// Without memory (HB_EVEXTBL_COPY) both stay.
 void VEX_copy_and_delete_global_config_tbl();
+
+// Whether anything was built into the table since it was emptied.
+bool is_table_built(const Hb_Configuration_Internal& table);
 
 // Sites and the names of networks stay.
 void empty_global_config_table(Hb_Configuration_Internal* table);
+
+// The same without releasing anything: what the table owned is another's.
+void forget_contents(Hb_Configuration_Internal& table);
 
 // Traces the table.
 void hb_vex_dump_global_table(Hb_Configuration_Internal* table, const char* name);
@@ -33,6 +39,14 @@ Hb_Rc hb_get_new_net_intf_info(zu_vex_net_intf_info_t** p_list);
 
 // Reads the boot list anew as well. The lists that were there are released.
 void hb_refresh_boot_ip_addrs(zu_vex_net_intf_info_t** p_list);
+
+// The two global lists; both operations run under their mutex. Taking them leaves none in force.
+struct Hb_Global_Lists {
+  zu_vex_net_intf_info_t* boot_addresses;
+  zu_vex_net_intf_info_t* interfaces;  // of the platform or copies
+};
+Hb_Global_Lists hb_take_global_lists();
+void hb_release_global_lists(Hb_Global_Lists lists);
 
 // Whether the list has the interface. Node -1 is any node; a name alone is enough, and so is an address alone.
 Hb_Boolean hb_check_if_in_netf_list_by_ipaddr_or_intf(zu_vex_net_intf_info_t* p_list, int node_number,

@@ -6,10 +6,6 @@
 
 namespace {
 
-bool is_ipv4_mapped(const in6_addr& address) {
-  return address.s6_addr32[0] == 0 && address.s6_addr32[1] == 0 && address.s6_addr32[2] == htonl(0xFFFF);
-}
-
 template <size_t N>
 void copy_text(char* to, const char (&text)[N]) {
   std::memcpy(to, text, N);
@@ -27,6 +23,10 @@ char* address_text(const in6_addr& address, char* out_p) {
 }
 
 }  // namespace
+
+bool is_ipv4_mapped(const in6_addr& address) {
+  return address.s6_addr32[0] == 0 && address.s6_addr32[1] == 0 && address.s6_addr32[2] == htonl(0xFFFF);
+}
 
 char* VEX_ntop(zu_vex_IP_address6_t* ip6, char* out_p) { return address_text(ip6->zu_vex_i6_ipv6, out_p); }
 

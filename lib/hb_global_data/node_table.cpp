@@ -1,5 +1,6 @@
 #include "hb_global_data/node_table.h"
 
+#include "hb_communication/configuration_parts.h"
 #include "hb_global_data/record_index.h"
 
 Record_Index<Hb_Adapter, HB_MAX_ADAPTERS> adapter_index;
@@ -27,13 +28,6 @@ bool has_configured_adapter(int node) {
     }
   }
   return false;
-}
-
-void free_and_forget(H_table_str*& table) {
-  if (table != nullptr) {
-    Hash_free(table);
-    table = nullptr;
-  }
 }
 
 }  // namespace

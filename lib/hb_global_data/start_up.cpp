@@ -59,11 +59,13 @@ Hb_Rc start_vex(zu_vex_net_intf_info_t** p_interfaces) {
   trace(Trace_Info, trace_vex_start);
   Hb_Rc rc = Hb_Failure;
   HB_MUTEX_SECTION_BEGIN(global_boot_ip_list_mutex)
+  const Hb_Global_Lists lists_of_last_start = hb_take_global_lists();
   rc = get_boot_interfaces(p_interfaces);
   if (rc == Hb_Failure) {
-    // The lists are dropped, not freed: others may still hold records of them.
-    global_boot_ip_list = nullptr;
-    global_vex_net_intf_tbl = nullptr;
+    // All lists are dropped, not freed, by the interface's definition.
+    hb_take_global_lists();
+  } else {
+    hb_release_global_lists(lists_of_last_start);
   }
   HB_MUTEX_SECTION_END(global_boot_ip_list_mutex)
   if (rc == Hb_Failure) {
@@ -74,7 +76,7 @@ Hb_Rc start_vex(zu_vex_net_intf_info_t** p_interfaces) {
 
 // Kept out of hb_init(), which every query goes through.
 [[gnu::cold, gnu::noinline]] Hb_Rc start() {
-  pthread_once(&hbapi_global_data_once, hbapi_global_data_once_init);
+  make_mutex_once();
   hbc_initialize_trace_once();
   clear_subscription_names();
   const bool daemon_mode = IsVEX == Hb_False;

@@ -6,5 +6,8 @@
 
 void hbapi_global_data_once_init();
 
+// Creates the two mutexes unless they are there. Whatever takes one of them begins with this.
+inline void make_mutex_once() { pthread_once(&hbapi_global_data_once, hbapi_global_data_once_init); }
+
 // Unlocks the mutex it is given; runs when a thread is cancelled while it holds one of the two.
 void hbapi_mutex_cleanup_handler(void* p_argument);

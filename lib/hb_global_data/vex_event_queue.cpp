@@ -1,7 +1,5 @@
 #include "hb_global_data/vex_event_queue.h"
 
-#include <unistd.h>
-
 #include <cerrno>
 #include <new>
 
@@ -9,16 +7,14 @@
 #include "VEX_HBC_trace.h"
 #include "hb_global_data/mutex_section.h"
 #include "hb_global_data/start_up.h"
+#include "platform/Pipe.h"
 
 Hb_VEX_Event* event_queue_list = nullptr;
 zu_int32_t event_sequence = 0;
 
 namespace {
 
-constexpr char wake_up = 1;
 constexpr auto no_group = static_cast<Hb_Group_Type>(-1);
-
-void make_mutex_once() { pthread_once(&hbapi_global_data_once, hbapi_global_data_once_init); }
 
 // The counter has no end of its own; behind the last number it goes on with the lowest.
 zu_int32_t take_number() {
@@ -58,7 +54,7 @@ Hb_Rc wake_caller() {
     trace(Trace_Info, trace_no_event_pipe);
     return fail(HB_ENOPIPEHANDLER);
   }
-  const ssize_t written = write(event_pipe_handler_p->getWriteFd(), &wake_up, sizeof wake_up);
+  const ssize_t written = write_to_pipe(event_pipe_handler_p->getWriteFd(), VEX_wake_up);
   if (written != 1) {
     trace_values(Trace_Info, trace_event_pipe_write_failed, written, errno);
     return fail(HB_EEVENTPIPE);
@@ -105,10 +101,10 @@ Hb_Boolean VEX_event_queue_is_empty() {
 }
 
 void VEX_add_event_at_end(Hb_VEX_Event* _event) {
+  make_mutex_once();
   if (_event == nullptr) {
     return;
   }
-  make_mutex_once();
   HB_MUTEX_SECTION_BEGIN(event_queue_list_and_sequence_mutex)
   append(_event);
   HB_MUTEX_SECTION_END(event_queue_list_and_sequence_mutex)

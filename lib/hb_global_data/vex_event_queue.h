@@ -4,6 +4,9 @@
 #include "hb_client/events.h"
 #include "hb_global_data/state.h"
 
+// What is written into the event pipe.
+inline constexpr char VEX_wake_up = 1;
+
 // Large, and so never copied: the queue owns it from the moment that it is appended until it is taken.
 struct VEX_Event {
   int32_t sequence_num;  // in the queue's numbering
@@ -11,7 +14,7 @@ struct VEX_Event {
   VEX_Event* next;
   uint32_t type;            // a VEX_Event_Type
   uint16_t node_num;        // the node that VEX_Daemon_Up is about
-  Hb_Site_Number site_num;  // the site that it is about
+  Hb_Site_Number site_num;  // 0: events of sites say in their group which sites they are about
 };
 
 enum VEX_Event_Type : uint32_t {
@@ -19,8 +22,8 @@ enum VEX_Event_Type : uint32_t {
   VEX_Daemon_Up = 1,  // only when the node is down because its group-services daemon was
 };
 
-// A new event of that group type with nothing in it, or null without memory. The membership is the caller's to fill:
-// 384 KiB are not written twice.
+// A new event of that group type that names nobody yet, stable and to be delivered as it is; null without memory. What
+// is in the group's union is the caller's to fill: 384 KiB are not written twice.
 Hb_VEX_Event* VEX_new_event(Hb_Group_Type type);
 
 // A new event that says that the configuration changed, or null. Its group is of no kind that would be copied.

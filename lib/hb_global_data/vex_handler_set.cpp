@@ -1,12 +1,9 @@
 #include "hb_global_data/vex_handler_set.h"
 
-#include <fcntl.h>
-#include <unistd.h>
-
 #include <algorithm>
-#include <cstring>
 #include <memory>
 #include <new>
+#include <utility>
 
 #include "VEX_EVMONAdapterEventHandler.h"
 #include "VEX_EVMONEventPipeHandler.h"
@@ -20,7 +17,10 @@
 #include "VEX_EVMONSplitMergeEventHandler.h"
 #include "hb_client/lifecycle.h"
 #include "hb_client/vex.h"
-#include "hb_global_data/state.h"
+#include "hb_global_data/start_up.h"
+#include "platform/Pipe.h"
+#include "text_copy.h"
+#include "vex_platform_records.h"
 
 char* evmon_cluster_name = nullptr;
 
@@ -37,22 +37,20 @@ EVMONSplitMergeEventHandler* split_merge_handler_p = nullptr;
 
 namespace {
 
-constexpr int monitors_are_absent = -1;
-
 enum class Creation { made, absent, failed };
 
 // Keeps the handler when it has a descriptor.
 template <typename Handler>
-Creation keep(Handler*& slot, std::unique_ptr<Handler> handler) {
+bool keep(Handler*& slot, std::unique_ptr<Handler> handler) {
   if (handler == nullptr) {
     set_hb_errno(HB_ENOMEM);
-    return Creation::failed;
+    return false;
   }
   if (handler->getFileDescriptor() == -1) {
-    return handler->getVEXEVMOpenRCInConstructor() == monitors_are_absent ? Creation::absent : Creation::failed;
+    return false;
   }
   slot = handler.release();
-  return Creation::made;
+  return true;
 }
 
 template <auto& Slot>
@@ -61,9 +59,14 @@ Creation open_monitor(char* path) {
   if (Slot != nullptr) {
     return Creation::made;
   }
-  return keep(Slot, std::unique_ptr<Handler>(new (std::nothrow) Handler(path)));
+  std::unique_ptr<Handler> handler(new (std::nothrow) Handler(path));
+  if (handler != nullptr && handler->getVEXEVMOpenRCInConstructor() == VEX_monitors_are_absent) {
+    return Creation::absent;
+  }
+  return keep(Slot, std::move(handler)) ? Creation::made : Creation::failed;
 }
 
+// The path can be changed: the handlers take it as `char*`, which they only read.
 struct Monitor {
   char path[40];
   Creation (*open)(char* path);
@@ -81,44 +84,23 @@ Monitor monitors[] = {
     {"/var/ha/evmon/peer_gs_liveness", open_monitor<peer_GS_liveness_handler_p>},
 };
 
-bool never_waits(int descriptor) { return fcntl(descriptor, F_SETFL, O_NONBLOCK) == 0; }
-
-class Pipe {
- public:
-  Pipe() { is_open_ = pipe2(ends_, O_CLOEXEC) == 0; }
-  ~Pipe() {
-    if (is_open_) {
-      close(ends_[0]);
-      close(ends_[1]);
-    }
+// The handler owns both ends from then on.
+template <typename Handler>
+std::unique_ptr<Handler> hand_over(Pipe& pipe) {
+  std::unique_ptr<Handler> handler(new (std::nothrow) Handler(pipe.ends(), nullptr));
+  if (handler != nullptr) {
+    pipe.hand_over();
   }
-  Pipe(const Pipe&) = delete;
-  Pipe& operator=(const Pipe&) = delete;
-
-  bool is_open() const { return is_open_; }
-  int read_end() const { return ends_[0]; }
-  int write_end() const { return ends_[1]; }
-
-  // A handler that owns both ends from then on.
-  template <typename Handler>
-  std::unique_ptr<Handler> hand_over() {
-    std::unique_ptr<Handler> handler(new (std::nothrow) Handler(ends_, nullptr));
-    is_open_ = is_open_ && handler == nullptr;
-    return handler;
-  }
-
- private:
-  int32_t ends_[2] = {-1, -1};
-  bool is_open_;
-};
+  return handler;
+}
 
 bool make_event_pipe() {
   if (event_pipe_handler_p != nullptr) {
     return true;
   }
   Pipe pipe;
-  return pipe.is_open() && never_waits(pipe.read_end()) && never_waits(pipe.write_end()) &&
-         keep(event_pipe_handler_p, pipe.hand_over<EVMONEventPipeHandler>()) == Creation::made;
+  return pipe.is_open() && pipe.read_without_waiting() && pipe.write_without_waiting() &&
+         keep(event_pipe_handler_p, hand_over<EVMONEventPipeHandler>(pipe));
 }
 
 bool make_new_group_pipe() {
@@ -126,38 +108,55 @@ bool make_new_group_pipe() {
     return true;
   }
   Pipe pipe;
-  return pipe.is_open() && never_waits(pipe.write_end()) &&
-         keep(new_group_event_handler_p, pipe.hand_over<EVMONNewGroupEventHandler>()) == Creation::made;
+  return pipe.is_open() && pipe.write_without_waiting() &&
+         keep(new_group_event_handler_p, hand_over<EVMONNewGroupEventHandler>(pipe));
 }
-
-struct Release_Cluster_Info {
-  void operator()(zu_vex_cluster_info_t* info) const { zu_vex_free_cluster_info(info); }
-};
 
 bool learn_cluster_name() {
   zu_vex_cluster_info_t* answer = nullptr;
   if (evmon_cluster_name != nullptr || zu_vex_get_cluster_info(&answer) != 0) {
     return true;
   }
-  const std::unique_ptr<zu_vex_cluster_info_t, Release_Cluster_Info> info(answer);
+  const Cluster_Answer info(answer);
   if (info == nullptr || info->p_cluster_name == nullptr) {
     return true;
   }
-  const size_t size = std::strlen(info->p_cluster_name) + 1;
-  evmon_cluster_name = new (std::nothrow) char[size];
+  evmon_cluster_name = new_copy_of(info->p_cluster_name);
   if (evmon_cluster_name == nullptr) {
     set_hb_errno(HB_ENOMEM);
     return false;
   }
-  std::memcpy(evmon_cluster_name, info->p_cluster_name, size);
   return true;
 }
 
+bool has_no_handler() {
+  const EVMONHandler* const handlers[] = {
+      adapter_event_handler_p, event_pipe_handler_p,    ip_change_handler_p,        new_group_event_handler_p,
+      node_list_handler_p,     node_liveness_handler_p, peer_GS_liveness_handler_p, cluster_reconfig_handler_p,
+      site_config_handler_p,   split_merge_handler_p,
+  };
+  return std::all_of(std::begin(handlers), std::end(handlers),
+                     [](const EVMONHandler* each) { return each == nullptr; });
+}
+
+// Whether the absence of all monitors is an error to be traced, in its scope.
+class Absence_Allowed {
+ public:
+  explicit Absence_Allowed(bool allowed) : before_(std::exchange(EVMONHandler::absence_is_no_error, allowed)) {}
+  ~Absence_Allowed() { EVMONHandler::absence_is_no_error = before_; }
+  Absence_Allowed(const Absence_Allowed&) = delete;
+  Absence_Allowed& operator=(const Absence_Allowed&) = delete;
+
+ private:
+  const bool before_;
+};
+
+// A platform without monitors has no handler; where there is one already, the others are missed.
 Creation open_first_monitor() {
-  EVMONHandler::absence_is_no_error = true;
+  const bool may_be_absent = has_no_handler();
+  const Absence_Allowed allowed(may_be_absent);
   const Creation creation = monitors[0].open(monitors[0].path);
-  EVMONHandler::absence_is_no_error = false;
-  return creation;
+  return creation == Creation::absent && !may_be_absent ? Creation::failed : creation;
 }
 
 bool open_other_monitors() {
@@ -174,6 +173,7 @@ void remove(Handler*& slot) {
 }  // namespace
 
 Hb_Rc VEX_create_global_event_handlers_internal() {
+  make_mutex_once();
   const Creation first = open_first_monitor();
   if (first == Creation::absent) {
     return Hb_Success;
@@ -184,6 +184,7 @@ Hb_Rc VEX_create_global_event_handlers_internal() {
 }
 
 Hb_Rc VEX_create_global_event_handlers() {
+  make_mutex_once();
   const Hb_Rc rc = VEX_create_global_event_handlers_internal();
   if (rc != Hb_Success) {
     VEX_delete_global_event_handlers();
@@ -192,10 +193,12 @@ Hb_Rc VEX_create_global_event_handlers() {
 }
 
 Hb_Rc hb_initialize_evmon_event_handlers(void) {
+  make_mutex_once();
   return hb_init() == Hb_Success ? VEX_create_global_event_handlers() : Hb_Failure;
 }
 
 void VEX_delete_global_event_handlers_except_brix_monitor() {
+  make_mutex_once();
   delete[] evmon_cluster_name;
   evmon_cluster_name = nullptr;
   remove(node_liveness_handler_p);

@@ -2,7 +2,8 @@
 //
 // What the interface leaves open:
 // - Every monitor is needed. Where the first one says that there are none here (-1), the platform has no monitors, and
-//   the set is empty; whatever else keeps a handler from being made, the whole set goes.
+//   the set is empty; but where a handler is there, its monitor was, and the others are missed. Whatever keeps a
+//   handler from being made, the whole set goes.
 // - A handler that is there already stays the one of its kind, so that creating the set again adds what is missing.
 // - A cluster that does not tell its name has none; memory that the name does not fit in is a failure.
 // - Nobody waits for room in a pipe: writing into a full one fails. Of the new-group pipe the read end waits, as its

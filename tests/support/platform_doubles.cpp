@@ -29,14 +29,20 @@ int category_of(tr_file_token token) {
   return -1;
 }
 
+// A trace library may use `errno` before it has read what it is given.
+void disturb_errno() {
+  if (platform_double().errno_after_trace != 0) errno = platform_double().errno_after_trace;
+}
+
 Recorded_Trace new_trace(Trace_Form form, const char* component, uint32_t id, tr_file_token token) {
+  disturb_errno();
   return {form, text_or_empty(component), id, token, category_of(token), {}, {}, {}};
 }
 
 void record(Recorded_Trace trace) {
   const std::lock_guard<std::mutex> hold(recording_mutex());
   platform_double().traces.push_back(std::move(trace));
-  if (platform_double().errno_after_trace != 0) errno = platform_double().errno_after_trace;
+  disturb_errno();
 }
 
 uint8_t level_of(const std::vector<uint8_t>& levels, size_t category) {

@@ -101,7 +101,7 @@ struct Platform_Double {
   int registration_result = 0;
   std::vector<Recorded_Registration> registrations;
   std::vector<Recorded_Trace> traces;
-  int errno_after_trace = 0;  // what each record leaves in `errno`; 0 leaves it alone
+  int errno_after_trace = 0;  // what each record has in `errno`, first and last; 0 leaves it alone
 
   // Assertions.
   Assertion_Action assertion_action = Assertion_Action::record_and_return;

@@ -2,6 +2,7 @@
 // force afterwards.
 #include <csignal>
 
+#include "VEX_EVMONAdapterEventHandler.h"
 #include "VEX_EVMONConfigurationHandler.h"
 #include "VEX_EVMONEventPipeHandler.h"
 #include "VEX_migration.h"
@@ -87,6 +88,9 @@ class ConfigurationUpdate : public TableState {
     EXPECT_EQ(out.seqnum, sequence);
   }
   bool is_group_untouched() const { return same_bytes(*out.group, *group_of_bytes(0x5A)); }
+
+  // The record of one step, which has a category and no values.
+  static std::vector<std::string> step(uint32_t id) { return value_lines(id); }
 
   // Which of the steps were traced.
   static std::vector<uint32_t> steps() {
@@ -185,6 +189,7 @@ TEST_F(ConfigurationUpdate, WithoutADifferenceTellsOfTheConfigurationAtOnce) {
   EXPECT_EQ(find_configured_adapter(48), &global_config_tbl.Hb_global_adapter_list[0]);
   EXPECT_EQ(global_config_tbl_new.Hb_global_adapter_list, nullptr);
   EXPECT_THAT(steps(), ElementsAre(233, 130, 285));
+  EXPECT_THAT(step(130), ElementsAre("Info 130"));
   EXPECT_THAT(dumped(), ElementsAre("Update global table: old table", "Update global table: new table",
                                     "Update global table: current table after copy"));
 }
@@ -221,6 +226,7 @@ TEST_F(ConfigurationUpdate, DeliversTheDeathOfAdaptersToWhoHasReadANotification)
   EXPECT_THAT(queued(), ElementsAre("configuration"));
   EXPECT_EQ(waiting_bytes(ends.read()), 1);
   EXPECT_THAT(steps(), ElementsAre(233, 128, 285));
+  EXPECT_THAT(step(128), ElementsAre("Info 128"));
 }
 
 TEST_F(ConfigurationUpdate, LeavesTheTableInForceWhileADeathIsPending) {
@@ -241,6 +247,7 @@ TEST_F(ConfigurationUpdate, WithoutASubscriptionDeliversTheEmptyEventAndTheGroup
   EXPECT_EQ(text_of(*out.group), "adapters 1: 96");
   EXPECT_THAT(queued(), ElementsAre("configuration"));
   EXPECT_THAT(steps(), ElementsAre(233, 128, 187, 285));
+  EXPECT_THAT(step(187), ElementsAre("Info 187"));
 }
 
 TEST_F(ConfigurationUpdate, QueuesTheDeathOfAdaptersWithoutANotification) {
@@ -259,6 +266,15 @@ TEST_F(ConfigurationUpdate, QueuesTheDeathOfAdaptersWithoutANotificationOrASubsc
   expect_outputs(0, "<EMPTY EVENT>", 0);
   EXPECT_THAT(queued(), ElementsAre("adapters 1: 96", "configuration"));
   EXPECT_EQ(value_lines(187).size(), 1U);
+}
+
+TEST_F(ConfigurationUpdate, WithoutAGroupDeliversTheDeathOfAdaptersAllTheSame) {
+  out.group = nullptr;
+  adapter_of_node_goes_down(2);
+  EXPECT_EQ(update_with_notification(), Hb_Success);
+  expect_outputs(1, "adapters", 0);
+  EXPECT_THAT(value_lines(67), ElementsAre("Info 67"));  // there is nothing to copy to
+  EXPECT_THAT(queued(), ElementsAre("configuration"));
 }
 
 TEST_F(ConfigurationUpdate, ReleasesTheDeathThatItDelivers) {
@@ -284,6 +300,7 @@ TEST_F(ConfigurationUpdate, QueuesTheDeathOfNodesAndDeliversTheEmptyEvent) {
   EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration"));
   EXPECT_EQ(by_node(global_config_tbl, 3)->state, Hb_Entity_Up);
   EXPECT_THAT(steps(), ElementsAre(233, 129, 285));
+  EXPECT_THAT(step(129), ElementsAre("Info 129"));
 }
 
 TEST_F(ConfigurationUpdate, QueuesDeathsThenTheConfigurationThenJoins) {
@@ -326,6 +343,37 @@ TEST_F(ConfigurationUpdate, ASecondConfigurationEventLeavesTheTableInForce) {
   EXPECT_EQ(find_configured_node(3)->state, Hb_Entity_Down);
 }
 
+// With neither deaths nor joins the refreshed table takes effect at once, and the event that waits finds none.
+TEST_F(ConfigurationUpdate, ARefreshWhileAConfigurationEventWaitsDoesNotEmptyTheTableInForce) {
+  EVMONAdapterEventHandler adapters(path);
+  adapter_event_handler_p = &adapters;
+  node_goes_down(3);
+  EXPECT_EQ(update_with_notification(), Hb_Success);
+  EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration"));
+  scripted_cluster().nodes[2].status = ZU_VEX_NODE_STATUS_UP;
+  hb_refresh_boot_ip_addrs_and_update_events();
+  EXPECT_EQ(global_config_tbl_new.node_list, nullptr);
+  for (int i = 0; i < 2; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
+  EXPECT_EQ(out.events, 128);
+  EXPECT_STREQ(out.name, "Hb_Config_Group");
+  EXPECT_EQ(global_config_tbl.Hb_num_nodes, 3);
+  EXPECT_NE(find_configured_adapter(144), nullptr);
+  adapter_event_handler_p = nullptr;
+}
+
+TEST_F(ConfigurationUpdate, ARefreshThatFindsTheSameDeathQueuesASecondConfigurationEventThatChangesNothing) {
+  EVMONAdapterEventHandler adapters(path);
+  adapter_event_handler_p = &adapters;
+  node_goes_down(3);
+  EXPECT_EQ(update_with_notification(), Hb_Success);
+  hb_refresh_boot_ip_addrs_and_update_events();
+  EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration", "nodes 1: 3", "configuration"));
+  for (int i = 0; i < 4; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
+  EXPECT_EQ(global_config_tbl.Hb_num_nodes, 3);
+  EXPECT_EQ(find_configured_node(3)->state, Hb_Entity_Down);
+  adapter_event_handler_p = nullptr;
+}
+
 // A client that moves to VEX mode.
 
 TEST_F(ConfigurationUpdate, OfAMovingClientQueuesEverything) {
@@ -335,7 +383,8 @@ TEST_F(ConfigurationUpdate, OfAMovingClientQueuesEverything) {
   node_comes(5);
   numbers_drawn = 1;  // by the configuration event, which gets another when it is queued
   EXPECT_EQ(update_with_notification(), Hb_Success);
-  EXPECT_TRUE(out.is_untouched());
+  expect_outputs(0, "<EMPTY EVENT>", 0);
+  EXPECT_TRUE(is_group_untouched());
   EXPECT_THAT(queued(), ElementsAre("adapters 1: 96", "nodes 1: 2", "configuration", "nodes 2: 5", "adapters 2: 240"));
   EXPECT_EQ(waiting_bytes(ends.read()), 1);
   EXPECT_EQ(by_node(global_config_tbl, 5), nullptr);
@@ -414,6 +463,50 @@ TEST_F(ConfigurationUpdate, WithoutMemoryTellsNothingAndFindsTheSameAgain) {
     }
   }
   EXPECT_GE(failures, 13U);  // eight of the table, and five events
+}
+
+// The death of node 3 and its configuration event are queued; memory fails when node 2 has died as well.
+TEST_F(ConfigurationUpdate, WithoutMemoryLeavesTheOlderNewTableToItsConfigurationEvent) {
+  trace_nothing();
+  node_goes_down(3);
+  EXPECT_EQ(update_with_notification(), Hb_Success);
+  const Hb_Node_config_state* waiting = global_config_tbl_new.node_list;
+  node_goes_down(2);
+  node_comes(5);
+  size_t failures = 0;
+  for (size_t nth = 1;; ++nth) {
+    const long before = live_allocations();
+    Hb_Rc rc = Hb_Success;
+    {
+      const AllocationFailure failure(nth);
+      rc = update_with_notification();
+    }
+    if (rc == Hb_Success) break;
+    ++failures;
+    EXPECT_EQ(live_allocations(), before) << nth;
+    EXPECT_EQ(global_config_tbl_new.node_list, waiting) << nth;
+    EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration")) << nth;
+    EXPECT_EQ(global_num_nodes, 3) << nth;
+    EXPECT_EQ(global_node_tbl[5], Hb_False) << nth;
+  }
+  EXPECT_GE(failures, 12U);  // eight of the table, and four events
+}
+
+TEST_F(ConfigurationUpdate, WithoutMemoryPutsNothingInForceThatIsNotTold) {
+  trace_nothing();
+  node_goes_down(3);
+  EXPECT_EQ(update_with_notification(), Hb_Success);
+  node_goes_down(2);
+  {
+    const AllocationFailure failure(1, false);
+    EXPECT_EQ(update_with_notification(), Hb_Failure);
+  }
+  for (int i = 0; i < 2; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
+  EXPECT_EQ(out.events, 128);
+  EXPECT_EQ(find_configured_node(3)->state, Hb_Entity_Down);
+  EXPECT_EQ(find_configured_node(2)->state, Hb_Entity_Up);  // its death is still to be told
+  EXPECT_EQ(update_with_notification(), Hb_Success);
+  EXPECT_THAT(queued(), ElementsAre("nodes 1: 2", "configuration"));
 }
 
 }  // namespace

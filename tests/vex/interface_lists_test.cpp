@@ -291,6 +291,91 @@ TEST_F(InterfaceLists, ACopyIsWholeAndHasANameOfItsOwn) {
   hb_free_net_intf_copies(list);
 }
 
+TEST_F(InterfaceLists, ACopyOfANameWithoutAnEndHas255Characters) {
+  std::string name(300, 'x');
+  name[255] = 'y';
+  zu_vex_net_intf_info_t original = {};
+  original.p_name = name.data();
+  EXPECT_EQ(hb_copy_net_intf_filter_by_flag(&list, &original, 0, Hb_False), Hb_Success);
+  ASSERT_NE(list, nullptr);
+  EXPECT_EQ(std::string(list->p_name), std::string(255, 'x'));
+  hb_free_net_intf_copies(list);
+}
+
+TEST_F(InterfaceLists, BehindTheLongestNameNothingIsRead) {
+  const std::unique_ptr<char[]> name(new char[255]);
+  std::memset(name.get(), 'x', 255);
+  zu_vex_net_intf_info_t original = {};
+  original.p_name = name.get();
+  EXPECT_EQ(hb_copy_net_intf_filter_by_flag(&list, &original, 0, Hb_False), Hb_Success);
+  ASSERT_NE(list, nullptr);
+  EXPECT_EQ(last_allocation(), 256U);
+  hb_free_net_intf_copies(list);
+}
+
+// A list whose last entry leads back to its second.
+class EndlessList : public InterfaceLists {
+ protected:
+  EndlessList() {
+    for (uint32_t i = 0; i < 3; ++i) {
+      names[i] = "en" + std::to_string(i);
+      records[i] = {};
+      records[i].node_number = 1;
+      records[i].p_name = names[i].data();
+      records[i].ip_addr = scripted_address(1, 1, static_cast<uint8_t>(i));
+    }
+    records[0].p_next = &records[1];
+    records[1].p_next = &records[2];
+    records[2].p_next = &records[1];
+  }
+
+  static size_t length_of(const zu_vex_net_intf_info_t* list) {
+    size_t length = 0;
+    for (; list != nullptr; list = list->p_next) ++length;
+    return length;
+  }
+
+  std::string names[3];
+  zu_vex_net_intf_info_t records[3];
+};
+
+TEST_F(EndlessList, HasWhatIsInItAndNothingElse) {
+  EXPECT_EQ(has(records, 1, "en2", nullptr), Hb_True);
+  EXPECT_EQ(has(records, 1, "en3", nullptr), Hb_False);
+}
+
+TEST_F(EndlessList, IsCopiedUpToFourTimesWhatATableHolds) {
+  EXPECT_EQ(hb_copy_net_intf_filter_by_flag(&list, records, 0, Hb_False), Hb_Success);
+  EXPECT_EQ(length_of(list), 4U * 98352);
+  hb_free_net_intf_copies(list);
+}
+
+TEST_F(EndlessList, OfBootAddressesTellsAliasesAllTheSame) {
+  trace_nothing();
+  scripted_cluster().interfaces = {interface_of(1, "en2", 2), interface_of(1, "en2", 3)};
+  for (const bool with_memory : {true, false}) {
+    {
+      const AllocationFailure failure(with_memory ? 1000 : 1);
+      EXPECT_EQ(hb_vex_get_net_intf_info_and_mark_alias(&list, records), Hb_Success);
+      EXPECT_NE(failure.happened(), with_memory);
+    }
+    EXPECT_THAT(lines_of(list), ElementsAre("1 en2 0", "1 en2 2"));
+    zu_vex_free_net_intf_info(list);
+  }
+}
+
+TEST_F(EndlessList, OfInterfacesIsMarkedAndReturns) {
+  trace_nothing();
+  scripted_cluster().boot_addresses = {interface_of(1, "en0", 0), interface_of(1, "en2", 2)};
+  read_boot_addresses();
+  platform_double().net_intf_info.answers.push_back({0, records});
+  EXPECT_EQ(hb_vex_get_net_intf_info_and_mark_alias(&list, global_boot_ip_list), Hb_Success);
+  ASSERT_EQ(list, records);
+  EXPECT_EQ(records[0].flags, 0U);
+  EXPECT_EQ(records[1].flags, 2U);
+  EXPECT_EQ(records[2].flags, 0U);
+}
+
 TEST_F(InterfaceLists, ACopyOfAnEntryWithoutANameHasNone) {
   zu_vex_net_intf_info_t* given = callers_list({{.node = 3, .name = std::nullopt}});
   EXPECT_EQ(hb_copy_net_intf_filter_by_flag(&list, given, 0, Hb_False), Hb_Success);
@@ -411,6 +496,32 @@ TEST_F(InterfaceLists, AliasesAreToldWithLittleMemoryAsWell) {
     EXPECT_THAT(lines_of(list), ElementsAre("1 en0 0", "1 en0 2", "1 en1 0")) << nth;
     zu_vex_free_net_intf_info(list);
   }
+}
+
+TEST_F(InterfaceLists, TheLargestNodeNumberIsNoNameForAnyNode) {
+  constexpr uint32_t largest = 0xFFFFFFFF;
+  trace_nothing();
+  scripted_cluster().boot_addresses = {interface_of(1, "en0", 0)};
+  scripted_cluster().interfaces = {interface_of(1, "en0", 0)};
+  scripted_cluster().interfaces[0].node = largest;
+  read_boot_addresses();
+  for (size_t nth = 1; nth <= 4; ++nth) {
+    {
+      const AllocationFailure failure(nth);  // of the records, the two arrays of the index, and nothing
+      EXPECT_EQ(hb_vex_get_net_intf_info_and_mark_alias(&list, global_boot_ip_list), Hb_Success);
+      EXPECT_EQ(failure.happened(), nth <= 3);
+    }
+    EXPECT_THAT(lines_of(list), ElementsAre("4294967295 en0 2")) << nth;
+    zu_vex_free_net_intf_info(list);
+  }
+}
+
+TEST_F(InterfaceLists, AStepThatFailsIsTracedWithTheErrnoItLeft) {
+  platform_double().boot_addrs.answers.push_back({-1, nullptr, 14});
+  platform_double().errno_after_trace = 5;
+  hb_refresh_boot_ip_addrs(&list);
+  EXPECT_EQ(errno, 14);
+  EXPECT_THAT(data_lines(271, 2), ElementsAre("Errors 271: [hb_refresh_boot_ip_addrs] [zu_vex_get_boot_addrs] -1 14"));
 }
 
 // The interfaces by the boot list in force.

@@ -379,6 +379,53 @@ TEST_F(TableBuild, LeavesOutNodesAndInterfacesThatNoTableHasAPlaceFor) {
 
 // Adapters.
 
+// Lists whose last record leads back to the first.
+
+TEST_F(TableBuild, OfAnEndlessListOfNodesTakesWhatATableHolds) {
+  zu_vex_node_info_t nodes_of_list[2] = {};
+  nodes_of_list[0].number = 4;
+  nodes_of_list[1].number = 5;
+  nodes_of_list[0].p_next = &nodes_of_list[1];
+  nodes_of_list[1].p_next = &nodes_of_list[0];
+  platform_double().node_info.answers.push_back({0, nodes_of_list});
+  EXPECT_EQ(build(), Hb_Success);
+  EXPECT_EQ(table.Hb_num_nodes, 2049);
+  scripted_cluster().reset();  // which has counted that it got such a list back
+}
+
+TEST_F(TableBuild, OfAnEndlessListOfNodesThatNoTableHasAPlaceForTakesNone) {
+  zu_vex_node_info_t node = {};
+  node.number = 2049;
+  node.p_next = &node;
+  platform_double().node_info.answers.push_back({0, &node});
+  EXPECT_EQ(build(), Hb_Success);
+  EXPECT_EQ(table.Hb_num_nodes, 0);
+  scripted_cluster().reset();
+}
+
+TEST_F(TableBuild, OfAnEndlessListOfInterfacesTakesWhatATableHolds) {
+  trace_nothing();
+  zu_vex_net_intf_info_t interfaces[2] = {};
+  interfaces[0].node_number = 1;
+  interfaces[0].ip_addr = scripted_address(1, 1, 0);
+  interfaces[1].node_number = 2049;
+  interfaces[0].p_next = &interfaces[1];
+  interfaces[1].p_next = &interfaces[0];
+  EXPECT_EQ(build(nullptr, interfaces), Hb_Success);
+  EXPECT_EQ(table.Hb_num_adapters, 48);
+}
+
+TEST_F(TableBuild, OfANameWithoutAnEnd35CharactersAreRead) {
+  const std::unique_ptr<char[]> name(new char[35]);
+  std::memset(name.get(), 'x', 35);
+  zu_vex_net_intf_info_t interface = {};
+  interface.node_number = 1;
+  interface.p_name = name.get();
+  EXPECT_EQ(build(nullptr, &interface), Hb_Success);
+  ASSERT_EQ(table.Hb_num_adapters, 1);
+  EXPECT_EQ(std::string(table.Hb_global_adapter_list[0].Hb_adapter_type), std::string(35, 'x'));
+}
+
 TEST_F(TableBuild, NumbersTheAdaptersOfEachNodeInTheOrderOfTheList) {
   scripted_cluster().nodes = {{.number = 1}, {.number = 2}};
   scripted_cluster().interfaces = {interface_of(2, "en0", 0),    interface_of(1, "en0", 1), interface_of(2, "en1", 2),

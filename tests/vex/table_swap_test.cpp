@@ -149,11 +149,39 @@ TEST_F(TableSwap, ReleasesWhatItReplaces) {
   EXPECT_EQ(live_allocations(), without_a_table);
 }
 
-TEST_F(TableSwap, WithoutANewTableLeavesTheOneInForce) {
+TEST_F(TableSwap, OfAnEmptyNewTableEmptiesTheOneInForce) {
+  empty_global_config_table(&global_config_tbl_new);
+  std::strcpy(global_config_tbl.Hb_global_network_list[1].Hb_network_name, "gone");
+  start_tracing();
+  VEX_copy_and_delete_global_config_tbl();
+  const Hb_Configuration_Internal& in_force = global_config_tbl;
+  EXPECT_EQ(in_force.local_node_number, 0);
+  EXPECT_EQ(in_force.Hb_max_nodes, 0);
+  EXPECT_EQ(in_force.Hb_num_nodes, 0);
+  EXPECT_EQ(in_force.Hb_adapters_per_node, 0);
+  EXPECT_EQ(in_force.Hb_num_adapters, 0);
+  EXPECT_EQ(in_force.Hb_num_networks, 0);
+  EXPECT_STREQ(in_force.Hb_global_network_list[0].Hb_network_name, "VEX_Network");
+  EXPECT_STREQ(in_force.Hb_global_network_list[1].Hb_network_name, "");
+  EXPECT_EQ(find_configured_adapter(48), nullptr);
+  EXPECT_THAT(trace_lines(), ElementsAre("Info 132: 0"));
+}
+
+TEST_F(TableSwap, OfAnEmptyNewTableMakesItsListsAndHashTablesAllTheSame) {
   empty_global_config_table(&global_config_tbl_new);
   VEX_copy_and_delete_global_config_tbl();
-  EXPECT_EQ(global_config_tbl.Hb_num_nodes, 2);
-  EXPECT_EQ(find_configured_adapter(48), &global_config_tbl.Hb_global_adapter_list[0]);
+  const Hb_Configuration_Internal& in_force = global_config_tbl;
+  ASSERT_NE(in_force.node_list, nullptr);
+  in_force.node_list[2048] = {7, Hb_Entity_Up, Hb_Entity_State_Reason_Up};  // it has so many entries
+  EXPECT_NE(in_force.Hb_global_adapter_list, nullptr);
+  ASSERT_NE(in_force.node_hash, nullptr);
+  EXPECT_STREQ(in_force.node_hash->name, "VEX_node list");
+  EXPECT_EQ(in_force.node_hash->size, 4099);
+  ASSERT_NE(in_force.adap_hash, nullptr);
+  EXPECT_STREQ(in_force.adap_hash->name, "Hb_Adapter list");
+  ASSERT_NE(in_force.ip_hash, nullptr);
+  EXPECT_STREQ(in_force.ip_hash->name, "Hb_IP list");
+  EXPECT_EQ(Hash_search(48, in_force.adap_hash), nullptr);
 }
 
 TEST_F(TableSwap, PutsANewTableWithoutMembersInForce) {
@@ -196,6 +224,46 @@ TEST_F(TableSwap, OfCountsBeyondTheListsTakesWhatIsThere) {
   EXPECT_EQ(global_config_tbl.Hb_num_adapters, 0);
   EXPECT_EQ(global_config_tbl.Hb_num_nodes, 2049);
 }
+
+// Whether a table was built.
+
+TEST_F(TableSwap, AnEmptiedTableIsNotBuilt) {
+  EXPECT_TRUE(is_table_built(global_config_tbl));
+  std::strcpy(global_config_tbl.Hb_global_network_list[0].Hb_network_name, "stays");
+  global_config_tbl.Hb_max_sites = 3;  // as sites do
+  empty_global_config_table(&global_config_tbl);
+  EXPECT_FALSE(is_table_built(global_config_tbl));
+}
+
+struct Something_Built {
+  const char* description;
+  void (*build)(Hb_Configuration_Internal& table);
+};
+
+class BuiltTable : public TableState, public testing::WithParamInterface<Something_Built> {};
+
+TEST_P(BuiltTable, IsToldByAnythingInIt) {
+  EXPECT_FALSE(is_table_built(table));
+  GetParam().build(table);
+  EXPECT_TRUE(is_table_built(table));
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Parts, BuiltTable,
+    testing::Values(Something_Built{"LocalNode", [](auto& table) { table.local_node_number = 1; }},
+                    Something_Built{"MostNodes", [](auto& table) { table.Hb_max_nodes = 1; }},
+                    Something_Built{"Nodes", [](auto& table) { table.Hb_num_nodes = 1; }},
+                    Something_Built{"AdaptersOfANode", [](auto& table) { table.Hb_adapters_per_node = 1; }},
+                    Something_Built{"Adapters", [](auto& table) { table.Hb_num_adapters = 1; }},
+                    Something_Built{"Networks", [](auto& table) { table.Hb_num_networks = 1; }},
+                    Something_Built{"AdapterList",
+                                    [](auto& table) { table.Hb_global_adapter_list = new Hb_Adapter[1]; }},
+                    Something_Built{"NodeList", [](auto& table) { table.node_list = new Hb_Node_config_state[1]; }},
+                    Something_Built{"AdapterHash", [](auto& table) { table.adap_hash = Hash_init("a", 1); }},
+                    Something_Built{"AddressHash", [](auto& table) { table.ip_hash = Hash_init("a", 1); }},
+                    Something_Built{"NodeHash", [](auto& table) { table.node_hash = Hash_init("a", 1); }},
+                    Something_Built{"SiteHash", [](auto& table) { table.site_hash = Hash_init("a", 1); }}),
+    [](const auto& test) { return test.param.description; });
 
 // Emptying.
 
