@@ -126,8 +126,9 @@ TEST_F(VexSubscription, WithTheInfoCategoryOffNothingIsTraced) {
   EXPECT_THAT(platform_double().traces, IsEmpty());
 }
 
-TEST_F(VexSubscription, AWriteToAClosedPipeFailsAndKeepsTheSystemError) {
-  signal(SIGPIPE, SIG_IGN);
+TEST_F(VexSubscription, AWriteToAClosedPipeFailsWithoutASignalAndKeepsTheSystemError) {
+  signal(SIGPIPE, SIG_DFL);
+  trace_only(trace_info);
   int ends[2];
   ASSERT_EQ(0, pipe(ends));
   close(ends[0]);
@@ -136,7 +137,10 @@ TEST_F(VexSubscription, AWriteToAClosedPipeFailsAndKeepsTheSystemError) {
   EXPECT_TRUE(fails_with(59, [&] { return subscribe(1); }));
   EXPECT_EQ(EPIPE, errno);
   EXPECT_THAT(names(), ElementsAre("follower", "", "", ""));
-  signal(SIGPIPE, SIG_DFL);
+  EXPECT_EQ(SIG_DFL, signal(SIGPIPE, SIG_DFL));
+  ASSERT_EQ(1U, platform_double().traces.size());
+  EXPECT_EQ(321U, platform_double().traces[0].id);
+  EXPECT_THAT(platform_double().traces[0].values, ElementsAre(0xFFFFFFFFU, static_cast<uint32_t>(EPIPE)));
 }
 
 TEST_F(VexSubscription, AFailedWriteForANetworkKeepsTheSystemErrorToo) {

@@ -1,6 +1,8 @@
 // From a ready descriptor to its handler.
 #include <fcntl.h>
 
+#include <utility>
+
 #include "handler_state.h"
 
 namespace hb_test {
@@ -104,6 +106,32 @@ TEST_F(Dispatch, IsSilentWithoutTracing) {
   platform_double().set_levels({0, 0, 0});
   EXPECT_EQ(dispatch({9999}), Hb_Failure);
   EXPECT_THAT(trace_lines(), IsEmpty());
+}
+
+// Whether the end of the dispatch was traced when its handler ran.
+class Looking_Handler : public Counting_Handler {
+ public:
+  Hb_Rc handler(Hb_Events* /*events*/, char* /*name*/, Hb_Group* /*group*/, Hb_Seq_Num* /*seqnum*/) override {
+    traced = trace_lines();
+    return Hb_Success;
+  }
+
+  std::vector<std::string> traced;
+};
+
+TEST_F(Dispatch, EndsInTheTraceWhenTheHandlerHasRun) {
+  Looking_Handler handler;
+  EXPECT_EQ(dispatch({handler.getFileDescriptor()}), Hb_Success);
+  EXPECT_THAT(handler.traced, ElementsAre("Info 252"));
+  EXPECT_THAT(trace_lines(), ElementsAre("Info 252", "Info 253"));
+}
+
+TEST_F(Dispatch, FindsNoHandlerWithoutAnArrayOfSlots) {
+  HandlerInstancesMap* slots = std::exchange(EVMONHandler::handlerInstances, nullptr);
+  ASSERT_GT(EVMONHandler::handlerListSlots, 0);
+  EXPECT_EQ(dispatch({first.getFileDescriptor()}), Hb_Failure);
+  EXPECT_EQ(hb_get_errno(), 81);
+  EVMONHandler::handlerInstances = slots;
 }
 
 TEST_F(Dispatch, FindsNoHandlerThatHasLeft) {

@@ -258,6 +258,27 @@ TEST_F(AdaptersOfANode, AreTracedAsTheyGoDown) {
   EXPECT_EQ(record.block_value(3), 1U);
 }
 
+// A list may have a number twice; each record is one adapter that goes down.
+TEST_F(AdaptersOfANode, CountAsOftenAsTheListHasThemWhenTheyDie) {
+  global_config_tbl.Hb_global_adapter_list[2].Hb_adapter_num = 5;
+  global_config_tbl.Hb_global_adapter_list[2].Hb_state = Hb_Entity_Up;
+  EXPECT_EQ(build(1, 1), Hb_Success);
+  ASSERT_NE(event, nullptr);
+  EXPECT_THAT(named(*event, 12), ElementsAre(3, 5));
+  EXPECT_EQ(adapters_of(*event).Hb_num_adapters, 3);
+  EXPECT_THAT(trace_lines(), ElementsAre("Errors 79", "Errors 80: 1 5", "Info 81: 1 5", "Errors 79", "Info 81: 1 3",
+                                         "Errors 79", "Info 81: 1 5", "Info 84: 1 3"));
+  EXPECT_EQ(global_config_tbl.Hb_global_adapter_list[2].Hb_state, Hb_Entity_Down);
+}
+
+TEST_F(AdaptersOfANode, AreTracedByTheirNamesFieldAlone) {
+  Hb_Adapter& adapter = global_config_tbl.Hb_global_adapter_list[0];
+  std::memset(adapter.Hb_adapter_type, 'x', sizeof adapter.Hb_adapter_type);
+  build(1, 1);
+  EXPECT_EQ(platform_double().traces_of(79)[0].blocks[0],
+            std::vector<uint8_t>(sizeof adapter.Hb_adapter_type, uint8_t{'x'}));
+}
+
 TEST_F(AdaptersOfANode, MakeNoEventWhereNoneIsUp) {
   EXPECT_EQ(build(2, 1), Hb_Success);
   EXPECT_EQ(event, nullptr);

@@ -189,6 +189,13 @@ TEST_F(EventPipeHandler, ServesTheQueueBehindAForeignByte) {
   EXPECT_THAT(trace_lines(), ElementsAre(of_pipe("Info 223: "), "Info 60: 7 1 72", of_pipe("Info 224: ")));
 }
 
+TEST_F(EventPipeHandler, TracesAForeignByteWithoutASign) {
+  put("\xFF");
+  EXPECT_EQ(serve(), Hb_Success);
+  EXPECT_EQ(hb_get_errno(), 72);
+  EXPECT_THAT(trace_lines(), ElementsAre(of_pipe("Info 223: "), "Info 60: 255 1 72", "Info 166"));
+}
+
 TEST_F(EventPipeHandler, ReadsOneOfManyForeignBytesAtATime) {
   ASSERT_EQ(write(ends.write(), "\x02\x03\x04", 3), 3);
   for (const int bytes : {2, 1, 0}) {
@@ -370,7 +377,11 @@ TEST_F(EventPipeHandler, BringsTheNewConfigurationIntoForce) {
   const std::vector<std::string> lines = trace_lines();
   EXPECT_THAT(lines, IsSupersetOf({of_pipe("Info 223: "), std::string("Info 131"), std::string("Info 121"),
                                    of_pipe("Info 224: ")}));
-  EXPECT_LT(std::find(lines.begin(), lines.end(), "Info 131"), std::find(lines.begin(), lines.end(), "Info 121"));
+  const auto copied = std::find(lines.begin(), lines.end(), "Info 132: 2");
+  EXPECT_LT(std::find(lines.begin(), lines.end(), "Info 131"), copied);
+  EXPECT_LT(copied, std::find(lines.begin(), lines.end(), "Info 121"));
+  ASSERT_EQ(platform_double().traces_of(134).size(), 1U);
+  EXPECT_THAT(platform_double().traces_of(134)[0].values, ElementsAre(2U, 9U, 0U, 1U, 3U, 0U));
   EXPECT_EQ(platform_double().traces_of(121)[0].block_text(0), "Event pipe handler: after copy");
 }
 
@@ -381,6 +392,28 @@ TEST_F(EventPipeHandler, NamesAConfigurationEventWhateverItsGroup) {
   EXPECT_STREQ(out.name, "Hb_Config_Group");
   EXPECT_EQ(out.events, 128);
   EXPECT_EQ(global_config_tbl.Hb_max_nodes, 9);
+}
+
+TEST_F(EventPipeHandler, NamesAConfigurationEventAlsoWhereItsGroupIsNotSubscribedTo) {
+  fill_table(global_config_tbl_new, 9, 3, {{1}}, {});
+  nodeEventSubscriptionName[0] = '\0';
+  queue(Hb_Node_Group, 128);
+  EXPECT_EQ(serve(), Hb_Success);
+  EXPECT_STREQ(out.name, "Hb_Config_Group");
+  EXPECT_EQ(out.events, 0);
+  EXPECT_EQ(global_config_tbl.Hb_max_nodes, 9);
+  EXPECT_THAT(trace_lines(), Contains("Info 189"));
+}
+
+// Only type 1 asks for the state of a node, here of one that would be unknown.
+TEST_F(EventPipeHandler, DeliversAnEventOfAnotherTypeAsItIs) {
+  Hb_VEX_Event* event = queue(Hb_Node_Group, 2);
+  event->type = 2;
+  event->node_num = 9;
+  EXPECT_EQ(serve(), Hb_Success);
+  EXPECT_EQ(out.events, 2);
+  EXPECT_STREQ(out.name, "nodes");
+  EXPECT_THAT(trace_lines(), ElementsAre(of_pipe("Info 223: "), "Info 180", of_pipe("Info 224: ")));
 }
 
 class DaemonUp : public EventPipeHandler {
@@ -422,6 +455,16 @@ TEST_F(DaemonUp, SaysNothingOfANodeThatIsUp) {
   EXPECT_EQ(serve(), Hb_Success);
   EXPECT_TRUE(out.is_empty_event());
   EXPECT_EQ(node_of(1).reason, Hb_Entity_State_Reason_Up);
+  EXPECT_THAT(trace_lines(), ElementsAre(of_pipe("Info 223: "), "Info 172: 1 1"));
+}
+
+TEST_F(DaemonUp, LeavesANodeAsItIsThatIsUpWhateverItsReason) {
+  node_of(1).reason = Hb_Entity_State_Reason_BRIXD_Down;
+  queue_daemon_up(1);
+  EXPECT_EQ(serve(), Hb_Success);
+  EXPECT_TRUE(out.is_empty_event());
+  EXPECT_EQ(node_of(1).state, Hb_Entity_Up);
+  EXPECT_EQ(node_of(1).reason, Hb_Entity_State_Reason_BRIXD_Down);
   EXPECT_THAT(trace_lines(), ElementsAre(of_pipe("Info 223: "), "Info 172: 1 1"));
 }
 

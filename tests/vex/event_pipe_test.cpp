@@ -1,4 +1,6 @@
 // The byte that wakes a caller.
+#include <csignal>
+
 #include "VEX_EVMONEventPipeHandler.h"
 #include "support/process_state.h"
 #include "tests_of_the_queue.h"
@@ -125,7 +127,7 @@ TEST_F(EventPipe, IsWrittenWhileTheMutexIsHeld) {
   make_pipe(1);
   QueueMutexCalls calls;
   EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Success);
-  EXPECT_THAT(calls.sequence(), ElementsAre("pthread_mutex_lock", "write", "pthread_mutex_unlock"));
+  EXPECT_THAT(calls.sequence(), ElementsAre("pthread_mutex_lock", "poll", "write", "pthread_mutex_unlock"));
 }
 
 TEST_F(EventPipe, HoldsNobodyUpWhenItIsFull) {
@@ -148,6 +150,50 @@ TEST_F(EventPipe, FailsWhenItsWriteEndWasClosedBehindTheLibrary) {
   EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Failure);
   EXPECT_EQ(errno, EBADF);
   EXPECT_THAT(trace_lines(), ElementsAre("Info 58: -1 9"));
+}
+
+// Nobody reads, and nobody is killed for it: the signal is left as it is, and nothing is written.
+TEST_F(EventPipe, FailsWithoutASignalWhenItsReadEndWasClosed) {
+  std::signal(SIGPIPE, SIG_DFL);
+  make_pipe(1);
+  close(ends.read());
+  QueueMutexCalls calls;
+  EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Failure);
+  EXPECT_EQ(errno, EPIPE);
+  EXPECT_EQ(hb_get_errno(), 59);
+  EXPECT_THAT(trace_lines(), ElementsAre("Info 58: -1 32"));
+  EXPECT_TRUE(calls.of("write").empty());
+  EXPECT_EQ(std::signal(SIGPIPE, SIG_DFL), SIG_DFL);
+  EXPECT_EQ(VEX_event_queue_is_empty(), Hb_False);
+  EXPECT_TRUE(is_mutex_free());
+}
+
+TEST_F(EventPipe, IsLookedAtOnceAndWithoutWaitingBeforeItIsWritten) {
+  make_pipe(1);
+  QueueMutexCalls calls;
+  EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Success);
+  ASSERT_EQ(calls.of("poll").size(), 1U);
+  EXPECT_THAT(calls.of("poll")[0].arguments, ElementsAre(testing::_, 1, 0, ends.write(), 0));
+}
+
+TEST_F(EventPipe, IsLookedAtAgainWhenASignalComesInBetween) {
+  make_pipe(1);
+  close(ends.read());
+  QueueMutexCalls calls;
+  calls.script("poll", {fail(EINTR), fail(EINTR)});
+  EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Failure);
+  EXPECT_EQ(errno, EPIPE);
+  EXPECT_EQ(calls.of("poll").size(), 3U);
+}
+
+TEST_F(EventPipe, IsWrittenWhenItCannotBeLookedAt) {
+  make_pipe(1);
+  QueueMutexCalls calls;
+  calls.script("poll", {fail(ENOMEM)});
+  errno = ENOTTY;
+  EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Success);
+  EXPECT_EQ(errno, ENOTTY);
+  EXPECT_EQ(waiting_bytes(ends.read()), 1);
 }
 
 // Three notifications wrote a byte each; every delivery but the last writes one more.

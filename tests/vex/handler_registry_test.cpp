@@ -2,6 +2,7 @@
 #include <fcntl.h>
 
 #include <climits>
+#include <utility>
 
 #include "handler_state.h"
 #include "support/allocation_faults.h"
@@ -22,6 +23,7 @@ class Pipe_Handler : public EVMONHandler {
     selfRegister();
   }
   const char* path() const { return evmon_fname; }
+  int fd() const { return evmon_fd; }
   void forget_descriptor() { evmon_fd = -1; }
   void set_descriptor(int descriptor) { evmon_fd = descriptor; }
 };
@@ -217,7 +219,100 @@ TEST_F(Registry, DoesNothingWhenAHandlerLeavesTwice) {
   EXPECT_EQ(EVMONHandler::numbersOfFileDescriptors, 0);
 }
 
+// Without an array it starts as at first, whatever was counted.
+TEST_F(Registry, StartsAnewWithoutAnArrayOfSlots) {
+  EVMONHandler::handlerListSlots = 30;
+  EVMONHandler::currentSlots = 25;
+  EVMONHandler::numbersOfFileDescriptors = 7;
+  const Pipe_Handler handler(new_descriptor());
+  EXPECT_EQ(EVMONHandler::handlerListSlots, 10);
+  EXPECT_EQ(EVMONHandler::currentSlots, 1);
+  EXPECT_EQ(EVMONHandler::numbersOfFileDescriptors, 1);
+  ASSERT_NE(EVMONHandler::handlerInstances, nullptr);
+  EXPECT_EQ(EVMONHandler::handlerInstances[0].handler, &handler);
+}
+
+TEST_F(Registry, IsEmptyWithoutAnArrayOfSlots) {
+  Pipe_Handler handler(new_descriptor());
+  const std::unique_ptr<HandlerInstancesMap[]> slots(std::exchange(EVMONHandler::handlerInstances, nullptr));
+  EXPECT_THAT(listed(), IsEmpty());
+  handler.selfUnregister();
+  EXPECT_EQ(EVMONHandler::numbersOfFileDescriptors, 1);
+  EXPECT_EQ(slots[0].handler, &handler);
+}
+
 // A descriptor that was closed behind the library's back may be handed out a second time.
+
+TEST_F(Registry, EmptiesTheFirstSlotOfTheDescriptorWhosesoeverItIs) {
+  const int descriptor = new_descriptor();
+  Pipe_Handler first(descriptor);
+  Pipe_Handler second(descriptor);
+  second.selfUnregister();
+  EXPECT_EQ(EVMONHandler::handlerInstances[0].fd, -1);
+  EXPECT_EQ(EVMONHandler::handlerInstances[0].handler, nullptr);
+  EXPECT_EQ(EVMONHandler::handlerInstances[1].fd, descriptor);
+  EXPECT_EQ(EVMONHandler::handlerInstances[1].handler, &second);
+  EXPECT_EQ(EVMONHandler::getNumbersOfFileDescriptors(), 1);
+  first.selfUnregister();
+  EXPECT_EQ(EVMONHandler::handlerInstances[1].handler, nullptr);
+  EXPECT_EQ(EVMONHandler::getNumbersOfFileDescriptors(), 0);
+}
+
+TEST_F(Registry, KeepsTheSecondHandlerOfADescriptorWhenTheFirstIsGone) {
+  const int descriptor = new_descriptor();
+  auto first = std::make_unique<Pipe_Handler>(descriptor);
+  const Pipe_Handler second(descriptor);
+  first = nullptr;
+  EXPECT_EQ(EVMONHandler::handlerInstances[0].handler, nullptr);
+  EXPECT_EQ(EVMONHandler::handlerInstances[1].handler, &second);
+  EXPECT_EQ(EVMONHandler::getNumbersOfFileDescriptors(), 1);
+}
+
+TEST_F(Registry, KeepsNothingOfAHandlerThatRegisteredTwice) {
+  const int descriptor = new_descriptor();
+  auto handler = std::make_unique<Pipe_Handler>(descriptor);
+  handler->selfRegister();
+  EXPECT_THAT(listed(), ElementsAre(descriptor, descriptor));
+  handler = nullptr;
+  for (const int slot : {0, 1}) {
+    EXPECT_EQ(EVMONHandler::handlerInstances[slot].fd, -1);
+    EXPECT_EQ(EVMONHandler::handlerInstances[slot].handler, nullptr);
+  }
+  EXPECT_EQ(EVMONHandler::getNumbersOfFileDescriptors(), 0);
+  EXPECT_THAT(listed(), IsEmpty());
+}
+
+TEST_F(Registry, KeepsTheOtherHandlerOnceWhenOneThatRegisteredTwiceIsGone) {
+  const int descriptor = new_descriptor();
+  const Pipe_Handler other(descriptor);
+  auto handler = std::make_unique<Pipe_Handler>(descriptor);
+  handler->selfRegister();
+  handler = nullptr;
+  EXPECT_EQ(EVMONHandler::handlerInstances[0].handler, nullptr);
+  EXPECT_EQ(EVMONHandler::handlerInstances[1].handler, &other);
+  EXPECT_EQ(EVMONHandler::handlerInstances[2].handler, nullptr);
+  EXPECT_EQ(EVMONHandler::getNumbersOfFileDescriptors(), 1);
+}
+
+// It leaves its own slot, with the descriptor, to the handler that loses one by it.
+TEST_F(Registry, KeepsNothingOfAHandlerWhoseDescriptorChanged) {
+  const Pipe_Handler other(new_descriptor());
+  auto handler = std::make_unique<Pipe_Handler>(new_descriptor());
+  auto lost = std::make_unique<Pipe_Handler>(new_descriptor());
+  close(handler->getFileDescriptor());
+  handler->set_descriptor(other.fd());
+  lost->forget_descriptor();
+  handler = nullptr;
+  EXPECT_EQ(EVMONHandler::handlerInstances[0].handler, nullptr);
+  EXPECT_EQ(EVMONHandler::handlerInstances[1].fd, other.fd());
+  EXPECT_EQ(EVMONHandler::handlerInstances[1].handler, &other);
+  EXPECT_EQ(EVMONHandler::getNumbersOfFileDescriptors(), 2);
+  lost = nullptr;
+  EXPECT_EQ(EVMONHandler::handlerInstances[2].fd, -1);
+  EXPECT_EQ(EVMONHandler::handlerInstances[2].handler, nullptr);
+  EXPECT_EQ(EVMONHandler::getNumbersOfFileDescriptors(), 1);
+}
+
 TEST_F(Registry, KeepsNoHandlerThatIsGoneWhenTwoHaveOneDescriptor) {
   const int descriptor = new_descriptor();
   auto first = std::make_unique<Pipe_Handler>(descriptor);

@@ -305,6 +305,39 @@ TEST_F(HandlerSet, IsDeletedInItsOrder) {
   expect_nothing();
 }
 
+// What the cluster was called when the first monitor went.
+const char* name_at_first_deletion = nullptr;
+
+class Watching_Handler : public EVMONNodeLivenessHandler {
+ public:
+  using EVMONNodeLivenessHandler::EVMONNodeLivenessHandler;
+  ~Watching_Handler() override { name_at_first_deletion = evmon_cluster_name; }
+};
+
+TEST_F(HandlerSet, ForgetsTheNameOfTheClusterBeforeItsFirstHandlerGoes) {
+  ASSERT_EQ(VEX_create_global_event_handlers(), Hb_Success);
+  char path[] = "/monitor";
+  delete node_liveness_handler_p;
+  node_liveness_handler_p = new Watching_Handler(path);
+  name_at_first_deletion = "not deleted";
+  VEX_delete_global_event_handlers();
+  EXPECT_EQ(name_at_first_deletion, nullptr);
+}
+
+// Where one handler was kept, a platform that has none any more is no platform without monitors.
+TEST_F(HandlerSet, GoesWhenTheMonitorsAreAbsentButOneWasKept) {
+  ASSERT_EQ(VEX_create_global_event_handlers(), Hb_Success);
+  hb_delete_evmon_event_handlers_except_brix_monitor();
+  ASSERT_NE(peer_GS_liveness_handler_p, nullptr);
+  scripted_cluster().has_monitors = false;
+  refused = 1;
+  start_tracing();
+  EXPECT_EQ(VEX_create_global_event_handlers(), Hb_Failure);
+  expect_nothing();
+  ASSERT_EQ(platform_double().traces_of(8).size(), 1U);
+  EXPECT_EQ(platform_double().traces_of(8)[0].block_value(1), 0xFFFFFFFFU);
+}
+
 TEST_F(HandlerSet, IsDeletedTwiceWithoutHarm) {
   ASSERT_EQ(VEX_create_global_event_handlers(), Hb_Success);
   hb_delete_evmon_event_handlers();
@@ -348,14 +381,88 @@ TEST_F(HandlerSet, IsMadeForAClientThatRuns) {
   EXPECT_THAT(handlers(), Not(Contains(nullptr)));
 }
 
-TEST_F(HandlerSet, StartsTheClientFirst) {
-  IsVEX = Hb_True;
-  scripted_cluster().nodes = {{0}};
-  EXPECT_EQ(hb_initialize_evmon_event_handlers(), Hb_Success);
+class StartedHandlerSet : public HandlerSet {
+ protected:
+  void SetUp() override {
+    HandlerSet::SetUp();
+    IsVEX = Hb_True;
+    const Scripted_Interface boot = {0, "en0", scripted_address(0, 0, 1), ZU_VEX_INTF_STATUS_UP, 0};
+    const Scripted_Interface alias = {0, "en0", scripted_address(0, 0, 9), ZU_VEX_INTF_STATUS_UP, 0};
+    scripted_cluster().nodes = {{0}};
+    scripted_cluster().boot_addresses = {boot};
+    scripted_cluster().interfaces = {boot, alias};
+  }
+  // The lists of the last start stay; they are the platform's.
+  void TearDown() override {
+    hb_release_global_lists(hb_take_global_lists());
+    EXPECT_EQ(Scripted_Cluster::outstanding(), 0U);
+    EXPECT_EQ(Scripted_Cluster::wrong_releases(), 0U);
+  }
+
+  // A start forgets its list of interfaces without aliases, by the interface's definition.
+  static Hb_Rc start_with(Hb_Rc (*function)()) {
+    const LeakAllowed forgotten_list;
+    return function();
+  }
+
+  static constexpr long forgotten_at_a_start = 2;      // the record of an interface, and its name
+  static constexpr size_t records_of_a_start = 1 + 2;  // boot addresses and interfaces
+};
+
+TEST_F(StartedHandlerSet, StartsTheClientFirst) {
+  EXPECT_EQ(start_with(hb_initialize_evmon_event_handlers), Hb_Success);
   EXPECT_EQ(client_initialized, Hb_True);
   EXPECT_THAT(handlers(), Not(Contains(nullptr)));
+  EXPECT_EQ(global_config_tbl.Hb_num_nodes, 1);
+  EXPECT_EQ(global_config_tbl.Hb_num_adapters, 1);
+  EXPECT_EQ(Scripted_Cluster::outstanding(), records_of_a_start);
   hb_terminate();
-  expect_nothing();
+  EXPECT_THAT(handlers(), Each(nullptr));
+  EXPECT_EQ(evmon_cluster_name, nullptr);
+}
+
+TEST_F(StartedHandlerSet, GivesTheListsOfTheLastStartBackWhenTheClientStartsAgain) {
+  for (int start = 0; start < 3; ++start) {
+    IsVEX = Hb_True;
+    EXPECT_EQ(start_with(hb_initialize_evmon_event_handlers), Hb_Success);
+    EXPECT_EQ(Scripted_Cluster::outstanding(), records_of_a_start) << start;
+    hb_terminate();
+    EXPECT_EQ(Scripted_Cluster::outstanding(), records_of_a_start) << start;
+  }
+}
+
+// A refresh puts copies in the place of the platform's interfaces.
+TEST_F(StartedHandlerSet, GivesTheCopiesOfARefreshBackWhenTheClientStartsAgain) {
+  platform_double().set_levels({0, 0, 0});
+  ASSERT_EQ(start_with(hb_init), Hb_Success);
+  hb_terminate();
+  const long live = live_allocations();
+  IsVEX = Hb_True;
+  ASSERT_EQ(start_with(hb_init), Hb_Success);
+  hb_refresh_boot_ip_addrs_and_update_events();
+  EXPECT_EQ(Scripted_Cluster::outstanding(), 1U);
+  hb_terminate();
+  IsVEX = Hb_True;
+  ASSERT_EQ(start_with(hb_init), Hb_Success);
+  EXPECT_EQ(Scripted_Cluster::outstanding(), records_of_a_start);
+  hb_terminate();
+  EXPECT_EQ(live_allocations(), live + 2 * forgotten_at_a_start);
+}
+
+// What they held is lost, by the interface's definition: the scripted cluster still counts it.
+TEST_F(StartedHandlerSet, DropsTheListsOfTheLastStartWhenTheNextOneFails) {
+  ASSERT_EQ(start_with(hb_init), Hb_Success);
+  hb_terminate();
+  zu_vex_net_intf_info_t* boot = global_boot_ip_list;
+  zu_vex_net_intf_info_t* interfaces = global_vex_net_intf_tbl;
+  IsVEX = Hb_True;
+  scripted_cluster().has_services = false;
+  EXPECT_EQ(hb_init(), Hb_Failure);
+  EXPECT_EQ(global_boot_ip_list, nullptr);
+  EXPECT_EQ(global_vex_net_intf_tbl, nullptr);
+  EXPECT_EQ(Scripted_Cluster::outstanding(), records_of_a_start);
+  zu_vex_free_net_intf_info(boot);
+  zu_vex_free_net_intf_info(interfaces);
 }
 
 TEST_F(HandlerSet, IsNotTouchedWhenTheClientDoesNotStart) {

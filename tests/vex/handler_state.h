@@ -169,6 +169,7 @@ class HandlerState : public testing::Test {
     std::memset(nodeEventSubscriptionName, 0, sizeof nodeEventSubscriptionName);
     std::memset(networkEventSubscriptionName, 0, sizeof networkEventSubscriptionName);
     std::memset(siteEventSubscriptionName, 0, sizeof siteEventSubscriptionName);
+    std::memset(splitMergeEventSubscriptionName, 0, sizeof splitMergeEventSubscriptionName);
     set_hb_errno(0);
     platform_double().reset();
   }

@@ -307,10 +307,10 @@ TEST_F(NewGroup, MissesTheNameOfTheClusterAndGoesOn) {
 
 TEST_F(NewGroup, OfUnknownKindIsRefused) {
   scripted_cluster().appear();
-  for (const char request : {'\x00', '\x03', '\x7F'}) {
-    EXPECT_EQ(ask(request), Hb_Failure);
+  for (const int request : {0, 3, 127, 255}) {
+    EXPECT_EQ(ask(static_cast<char>(request)), Hb_Failure);
     EXPECT_EQ(hb_get_errno(), 68);
-    EXPECT_THAT(trace_lines(), ElementsAre(begins(), "Info 35: " + std::to_string(int{request}) + " 1 68", "Info 228"));
+    EXPECT_THAT(trace_lines(), ElementsAre(begins(), "Info 35: " + std::to_string(request) + " 1 68", "Info 228"));
     EXPECT_TRUE(out.is_untouched());
   }
 }

@@ -74,7 +74,7 @@ TEST_F(VexRequests, AMessageIsNotTracedWhenNothingIs) {
 
 TEST_F(VexRequests, AMessageThatCannotWakeTheCallerFailsAndStaysQueued) {
   make_event_pipe();
-  std::signal(SIGPIPE, SIG_IGN);
+  std::signal(SIGPIPE, SIG_DFL);
   close(ends.read());
   EXPECT_EQ(hb_vex_msg_received_from(7), Hb_Failure);
   EXPECT_EQ(errno, EPIPE);
