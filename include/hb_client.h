@@ -10,7 +10,7 @@
  *
  * Operations return `Hb_Success` or `Hb_Failure`; after a failure hb_get_errno() tells why. None of them throws,
  * starts a thread or changes how signals are handled. A program that goes on after its daemon is gone ignores
- * SIGPIPE. One thread at a time may drive the library.
+ * SIGPIPE, which VEX mode does not raise. One thread at a time may drive the library.
  */
 #ifndef HB_CLIENT_H
 #define HB_CLIENT_H

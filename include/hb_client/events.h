@@ -34,18 +34,22 @@ enum Hb_Event_Bits {
  *   mode those of its descriptors that are ready. An array that starts with -1 fails without an error number.
  * @param timeout longest wait in daemon mode, relative; null waits without limit. It is not changed.
  * @param events receives the event bits.
- * @param name receives the name of the subscription, at least 32 bytes, always terminated. A configuration update is
- *   named "Hb_Config_Group", a failure-data identifier "Hb_FFDC_Group".
+ * @param name receives the name of the subscription, at least 32 bytes, terminated where it is written. A configuration
+ *   update is named "Hb_Config_Group", a failure-data identifier "Hb_FFDC_Group". In VEX mode some notifications write
+ *   neither name nor sequence number, that of an alias and those that say nothing among them: fill both before.
  * @param group receives who is concerned; read it with the accessors of hb_client/group.h. A configuration update
  *   and a heartbeat event leave its membership as it was.
- * @param seqnum_p receives the daemon's number of the event, as sent; 0 in VEX mode.
+ * @param seqnum_p receives the daemon's number of the event, as sent. In VEX mode 0, or of a node's death and return
+ *   and of a split and a merge the low 32 bits of the report's number.
  *
  * A configuration update replaces the configuration that the queries of hb_client/configuration.h read; one that
  * is not usable is refused and the old one stays.
  *
  * @return `Hb_Success`, or `Hb_Failure` with `HB_EINVAL` (a null pointer; nothing was taken), `HB_ENOTREADY`,
  * `HB_ECOMM`, `HB_EDAEMONGONE`, `HB_EBADREPLY` (a packet that is no event or not whole; it is lost), `HB_ENOMEM`,
- * or in VEX mode `HB_ENOPIPEHANDLER` and `HB_EDISPATCH`.
+ * or in VEX mode `HB_ENOPIPEHANDLER`, `HB_EDISPATCH`, `HB_EMONITOR_READ`, `HB_EVEXTBL_BUILD`, `HB_EVEXTBL_ENTRY`,
+ * `HB_EVEXTBL_INTF`, `HB_EVEXGROUP`, or `HB_EEVENTPIPE`: with that one the outputs are an event that was delivered, and
+ * only the wake-up for the next one failed. A monitor that cannot be read fails without an error number.
  */
 HB_API Hb_Rc hb_get_event_message(int* descriptors, struct timeval* timeout, Hb_Events* events, char* name,
                                   Hb_Group* group, Hb_Seq_Num* seqnum_p);

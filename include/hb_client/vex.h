@@ -18,9 +18,10 @@ extern HB_API Hb_Boolean IsVEX;
  * Starts the client and opens the monitors. Call it in VEX mode before the descriptors are asked for.
  *
  * Where the platform has no monitors there is nothing to open, and that is a success. When a monitor cannot be opened
- * none of them stays open.
+ * or a pipe cannot be made, nothing stays open.
  *
- * @return `Hb_Success`, or `Hb_Failure` as hb_init() does, or when a monitor could not be opened.
+ * @return `Hb_Success`, or `Hb_Failure` as hb_init() does, with `HB_ENOMEM`, or without an error number when a monitor
+ * could not be opened or a pipe not be made.
  */
 HB_API Hb_Rc hb_initialize_evmon_event_handlers(void);
 
@@ -35,7 +36,7 @@ HB_API void hb_delete_evmon_event_handlers_except_brix_monitor(void);
  * comes back, by an event that is taken from the descriptors as any other.
  *
  * @return `Hb_Success`, or `Hb_Failure` as hb_init() does, with `HB_ENOPIPEHANDLER` (there are no monitors), or
- * `HB_EEVENTPIPE` (the caller could not be woken).
+ * `HB_EEVENTPIPE` (the caller could not be woken). Without memory for the event there is none, which is a success.
  */
 HB_API Hb_Rc hb_vex_msg_received_from(Hb_Node_Number node);
 
