@@ -6,6 +6,7 @@
 #include <cerrno>
 
 #include "VEX_HBC_trace.h"
+#include "platform_list.h"
 #include "platform_membership.h"
 #include "vex_outputs.h"
 #include "vex_platform_records.h"
@@ -24,9 +25,9 @@ Hb_Rc deliver_nothing(const Vex_Outputs& out, Trace_Record unsubscribed) {
 // Each yields the number of members that it named.
 int32_t name_nodes(const zu_vex_node_info_t* nodes, Hb_Boolean* list) {
   int32_t count = 0;
-  for (; nodes != nullptr; nodes = nodes->p_next) {
-    if (is_known_node_up(*nodes) && !is_member(list[nodes->number])) {
-      list[nodes->number] = Hb_True;
+  for (const zu_vex_node_info_t& node : records_of(nodes)) {
+    if (is_known_node_up(node) && !is_member(list[node.number])) {
+      list[node.number] = Hb_True;
       ++count;
     }
   }
@@ -35,9 +36,9 @@ int32_t name_nodes(const zu_vex_node_info_t* nodes, Hb_Boolean* list) {
 
 int32_t name_adapters(const zu_vex_net_intf_info_t* interfaces, Hb_Incarnation* list) {
   int32_t count = 0;
-  for (; interfaces != nullptr; interfaces = interfaces->p_next) {
-    const Hb_Adapter* adapter = find_adapter_of_interface(global_config_tbl, *interfaces);
-    if (adapter != nullptr && adapter->Hb_adapter_num < HB_MAX_ADAPTERS && is_interface_up(*interfaces, *adapter) &&
+  for (const zu_vex_net_intf_info_t& interface : records_of(interfaces)) {
+    const Hb_Adapter* adapter = find_adapter_of_interface(global_config_tbl, interface);
+    if (adapter != nullptr && adapter->Hb_adapter_num < HB_MAX_ADAPTERS && is_interface_up(interface, *adapter) &&
         !is_member(list[adapter->Hb_adapter_num])) {
       list[adapter->Hb_adapter_num] = VEX_named_in_group;
       ++count;

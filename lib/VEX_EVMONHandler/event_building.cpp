@@ -4,6 +4,7 @@
 #include "VEX_EVMONHandler.h"
 #include "VEX_HBC_trace.h"
 #include "hb_communication/event_reception.h"
+#include "platform_list.h"
 #include "platform_membership.h"
 #include "vex_outputs.h"
 #include "vex_platform_records.h"
@@ -106,15 +107,15 @@ Hb_Rc take_adapters_down(zu_int32_t node, Adapter_Event& event) {
 // The node's interfaces that are up are named in the event, as far as the configuration knows them. One may be listed
 // several times.
 Hb_Rc bring_adapters_up(zu_int32_t node, Adapter_Event& event, const zu_vex_net_intf_info_t* interfaces) {
-  for (const auto* interface = interfaces; interface != nullptr; interface = interface->p_next) {
-    if (interface->node_number != static_cast<uint32_t>(node) || interface->status != ZU_VEX_INTF_STATUS_UP) {
+  for (const zu_vex_net_intf_info_t& interface : records_of(interfaces)) {
+    if (interface.node_number != static_cast<uint32_t>(node) || interface.status != ZU_VEX_INTF_STATUS_UP) {
       continue;
     }
-    const Hb_Adapter* named = find_adapter_of_interface(table_about_to_take_effect(), *interface);
+    const Hb_Adapter* named = find_adapter_of_interface(table_about_to_take_effect(), interface);
     if (named != nullptr && !event.name_once(named->Hb_adapter_num)) {
       return fail(HB_ENOMEM);
     }
-    Hb_Adapter* present = find_adapter_of_interface(global_config_tbl, *interface);
+    Hb_Adapter* present = find_adapter_of_interface(global_config_tbl, interface);
     if (present != nullptr) {
       present->Hb_state = Hb_Entity_Up;
     }

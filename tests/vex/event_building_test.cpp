@@ -383,6 +383,22 @@ TEST_F(AdaptersOfANode, CountOnceHoweverOftenTheyAreReported) {
   EXPECT_EQ(adapters_of(*event).Hb_num_adapters, 2);
 }
 
+// A list that leads back into itself comes to an end.
+TEST_F(AdaptersOfANode, JoinAlsoFromAListWithoutAnEnd) {
+  set_levels(0);
+  char name[] = "en4";
+  zu_vex_net_intf_info_t record = {};
+  record.node_number = 1;
+  record.p_name = name;
+  record.ip_addr = scripted_address(0, 0, 4);
+  record.status = ZU_VEX_INTF_STATUS_UP;
+  record.p_next = &record;
+  platform_double().net_intf_info.answers = {{0, &record}};
+  EXPECT_EQ(build(1, 2), Hb_Success);
+  ASSERT_NE(event, nullptr);
+  EXPECT_EQ(adapters_of(*event).Hb_num_adapters, 1);
+}
+
 // The event is taken behind the one that brings the new table into force.
 TEST_F(AdaptersOfANode, JoinUnderTheNumbersOfTheTableThatIsAboutToTakeEffect) {
   fill_table(

@@ -286,6 +286,30 @@ TEST_F(NewGroup, OfAdaptersStaysInTheRecordWhateverTheConfigurationSays) {
   EXPECT_TRUE(same_bytes(*out.group, *expected));
 }
 
+// A list that leads back into itself comes to an end.
+TEST_F(NewGroup, OfNodesComesToAnEndWhenTheListDoesNot) {
+  zu_vex_node_info_t node = {};
+  node.number = 2;
+  node.status = ZU_VEX_NODE_STATUS_UP;
+  node.p_next = &node;
+  platform_double().node_info.answers = {{0, &node}};
+  EXPECT_EQ(ask(node_group), Hb_Success);
+  EXPECT_EQ(out.group->Hb_membership_grp_union.Hb_node_membership_grp.Hb_num_nodes, 1);
+}
+
+TEST_F(NewGroup, OfAdaptersComesToAnEndWhenTheListDoesNot) {
+  char name[] = "en3";
+  zu_vex_net_intf_info_t record = {};
+  record.node_number = 1;
+  record.p_name = name;
+  record.ip_addr = scripted_address(0, 0, 3);
+  record.status = ZU_VEX_INTF_STATUS_UP;
+  record.p_next = &record;
+  platform_double().net_intf_info.answers = {{0, &record}};
+  EXPECT_EQ(ask(adapter_group), Hb_Success);
+  EXPECT_EQ(out.group->Hb_membership_grp_union.Hb_adapter_membership_grp.Hb_num_adapters, 1);
+}
+
 TEST_F(NewGroup, NeedsNoGroupOfTheCaller) {
   scripted_cluster().appear();
   scripted_cluster().nodes = {{0}};
