@@ -4,13 +4,11 @@
 #include <cerrno>
 
 #include "VEX_interface_changes.h"
+#include "vex_present_interfaces.h"
 
 namespace {
 
 typedef zu_evm_event_adapter_liveness_t Notification;
-
-constexpr const char* p_adapterEVMONinitstr = "BUF_SIZE=1048576;CHANGED=YES;CLUSTER=YES\n";
-constexpr Hb_Incarnation named_in_group = 0;
 
 Hb_Adapter_Membership_Grp& members_of(Hb_Group& group) {
   return group.Hb_membership_grp_union.Hb_adapter_membership_grp;
@@ -19,12 +17,6 @@ Hb_Adapter_Membership_Grp& members_of(Hb_Group& group) {
 void clear_members(Hb_Group& group) {
   const auto entries = std::min<Hb_Adapter_Number>(adapter_number_limit(global_config_tbl), HB_MAX_ADAPTERS);
   std::fill_n(members_of(group).Hb_adapter_list, entries, HB_NOT_IN_GROUP);
-}
-
-void name_member(Hb_Group& group, Hb_Adapter_Number adapter) {
-  if (adapter < HB_MAX_ADAPTERS) {
-    members_of(group).Hb_adapter_list[adapter] = named_in_group;
-  }
 }
 
 zu_evm_event_metadata_t metadata_of(Notification& notification) {
@@ -49,27 +41,35 @@ struct Transition_Count {
   int32_t duplicated_cnt = 0;
 };
 
-// In the table in force; those that change are named in the group.
-Transition_Count change_adapters(const Notification& notification, const Transition& transition, Hb_Group& group) {
+// In the table in force; those that change are named in the group, if there is one.
+Transition_Count change_adapters(const Notification& notification, const Transition& transition,
+                                 const Present_Interfaces& present, Hb_Group* group) {
   Transition_Count count;
   for_each_adapter_on(global_config_tbl, notification.node_number, notification.p_interface_name,
                       [&](Hb_Adapter& adapter) {
                         trace(Trace_Info, trace_adapter_in_table);
-                        if (adapter.Hb_state == transition.state) {
+                        if (adapter.Hb_state == transition.state || present.contradict(adapter, transition.state)) {
                           ++count.duplicated_cnt;
                           return;
                         }
                         ++count.changed_cnt;
                         adapter.Hb_state = transition.state;
-                        name_member(group, adapter.Hb_adapter_num);
+                        if (group != nullptr) {
+                          members_of(*group).Hb_adapter_list[adapter.Hb_adapter_num] = VEX_named_in_group;
+                        }
                         trace(Trace_Info, transition.changed);
                       });
   return count;
 }
 
-void change_waiting_table(const Notification& notification, const Transition& transition) {
+void change_waiting_table(const Notification& notification, const Transition& transition,
+                          const Present_Interfaces& present) {
   for_each_adapter_on(global_config_tbl_new, notification.node_number, notification.p_interface_name,
-                      [&](Hb_Adapter& adapter) { adapter.Hb_state = transition.state; });
+                      [&](Hb_Adapter& adapter) {
+                        if (!present.contradict(adapter, transition.state)) {
+                          adapter.Hb_state = transition.state;
+                        }
+                      });
 }
 
 // One notification, and where it is told.
@@ -116,8 +116,9 @@ Hb_Rc Interface_Change::came_or_went() {
 
 Hb_Rc Interface_Change::changed_state(const Transition& transition) {
   trace(Trace_Info, trace_adapter_compared_with_table);
-  const Transition_Count count = change_adapters(notification_, transition, *out_.group);
-  change_waiting_table(notification_, transition);
+  const Present_Interfaces present(notification_.node_number, metadata_of(notification_));
+  const Transition_Count count = change_adapters(notification_, transition, present, out_.group);
+  change_waiting_table(notification_, transition, present);
   if (count.changed_cnt != 0) {
     return deliver(transition, count.changed_cnt);
   }
@@ -137,13 +138,10 @@ Hb_Rc Interface_Change::not_in_table(const Transition& transition) {
 Hb_Rc Interface_Change::deliver(const Transition& transition, int32_t count) {
   *out_.events = transition.event;
   handler_.fillInOneAdapterEvent(out_.events, out_.name, out_.group, out_.seqnum);
-  members_of(*out_.group).Hb_num_adapters = count;
+  if (out_.group != nullptr) {
+    members_of(*out_.group).Hb_num_adapters = count;
+  }
   return Hb_Success;
-}
-
-Hb_Rc cannot_be_read(int read_result, int descriptor) {
-  trace_values(Trace_Errors, trace_adapter_liveness_read_failed, read_result, descriptor, errno);
-  return Hb_Failure;
 }
 
 }  // namespace
@@ -153,7 +151,9 @@ EVMONAdapterEventHandler::EVMONAdapterEventHandler(char* path)
 
 Hb_Rc EVMONAdapterEventHandler::handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) {
   trace_values(Trace_Info, trace_adapter_liveness_begins, evmon_fd);
-  clear_members(*group);
+  if (group != nullptr) {
+    clear_members(*group);
+  }
   const Hb_Rc rc = read_and_tell({events, name, group, seqnum_p});
   trace_values(Trace_Info, trace_adapter_liveness_ends, evmon_fd);
   return rc;
@@ -168,7 +168,7 @@ Hb_Rc EVMONAdapterEventHandler::read_and_tell(const Vex_Outputs& out) {
     return Hb_Success;
   }
   if (read_result != ZU_EVM_RECORD || record == nullptr) {
-    return cannot_be_read(read_result, evmon_fd);
+    return cannot_be_read(trace_adapter_liveness_read_failed, read_result, evmon_fd, errno);
   }
   const Monitor_Record<Notification> notification(record);
   return Interface_Change(*this, *notification, out).tell();

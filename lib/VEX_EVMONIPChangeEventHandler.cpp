@@ -11,8 +11,6 @@ namespace {
 
 typedef zu_evm_event_ip_change_t Notification;
 
-constexpr const char* p_ipchangeEVMONinitstr = "BUF_SIZE=1048576;CHANGED=YES;CLUSTER=YES\n";
-
 void trace_notification(Notification& notification) {
   char address[INET6_ADDRSTRLEN];
   VEX_ntop(&notification.ip_addr, address);
@@ -73,11 +71,6 @@ Hb_Rc tell(EVMONConfigurationHandler& handler, Notification& notification, const
   }
 }
 
-Hb_Rc cannot_be_read(int read_result, int descriptor) {
-  trace_values(Trace_Errors, trace_ip_change_read_failed, read_result, descriptor, errno);
-  return Hb_Failure;
-}
-
 }  // namespace
 
 EVMONIPChangeEventHandler::EVMONIPChangeEventHandler(char* path)
@@ -99,7 +92,7 @@ Hb_Rc EVMONIPChangeEventHandler::read_and_tell(const Vex_Outputs& out) {
     return Hb_Success;
   }
   if (read_result != ZU_EVM_RECORD || record == nullptr) {
-    return cannot_be_read(read_result, evmon_fd);
+    return cannot_be_read(trace_ip_change_read_failed, read_result, evmon_fd, errno);
   }
   const Monitor_Record<Notification> notification(record);
   return tell(*this, *notification, out);

@@ -14,6 +14,9 @@
 
 struct Vex_Outputs;
 
+// What the monitor is armed with.
+inline constexpr const char* p_ipchangeEVMONinitstr = "BUF_SIZE=1048576;CHANGED=YES;CLUSTER=YES\n";
+
 class EVMONIPChangeEventHandler : public EVMONConfigurationHandler {
  public:
   explicit EVMONIPChangeEventHandler(char* path);

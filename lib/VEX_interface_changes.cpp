@@ -7,10 +7,8 @@ bool is_boot_interface(uint32_t node, const char* name, zu_vex_IP_address6_t* ad
          hb_check_if_in_global_boot_ip_list(static_cast<int>(node), name != nullptr ? name : "", address) == Hb_True;
 }
 
-bool is_adapter_on(const Hb_Configuration_Internal& table, const Hb_Adapter& adapter, uint32_t node, const char* name) {
-  return table.Hb_adapters_per_node > 0 &&
-         adapter.Hb_adapter_num / static_cast<uint32_t>(table.Hb_adapters_per_node) == node &&
-         std::strncmp(adapter.Hb_adapter_type, name != nullptr ? name : "", interface_name_length) == 0;
+bool is_adapter_on(const Hb_Adapter& adapter, const char* name) {
+  return std::strncmp(adapter.Hb_adapter_type, name != nullptr ? name : "", interface_name_length) == 0;
 }
 
 Hb_Rc rebuild_and_tell(EVMONConfigurationHandler& handler, zu_evm_event_metadata_t metadata, const Vex_Outputs& out) {

@@ -9,8 +9,8 @@
 // Whether the node starts with that interface. Without an address the name alone counts.
 bool is_boot_interface(uint32_t node, const char* name, zu_vex_IP_address6_t* address);
 
-// The adapter is one of the node's interface of that name.
-bool is_adapter_on(const Hb_Configuration_Internal& table, const Hb_Adapter& adapter, uint32_t node, const char* name);
+// The adapter is one of an interface of that name.
+bool is_adapter_on(const Hb_Adapter& adapter, const char* name);
 
 // Lists the interfaces anew and tells what the notification changes. Fails with HB_EVEXTBL_INTF, and writes nothing,
 // when the interfaces cannot be listed.
@@ -25,14 +25,9 @@ inline Hb_Rc deliver_alias(const Vex_Outputs& out) {
 // Calls use(adapter) for each address of the node's interface of that name.
 template <typename Use>
 void for_each_adapter_on(const Hb_Configuration_Internal& table, uint32_t node, const char* name, Use use) {
-  if (node >= HB_MAX_NODES || table.Hb_adapters_per_node <= 0) {
-    return;
-  }
-  const auto slots = static_cast<uint32_t>(table.Hb_adapters_per_node);
-  for (uint32_t slot = 0; slot < slots; ++slot) {
-    auto* adapter = static_cast<Hb_Adapter*>(Hash_search(node * slots + slot, table.adap_hash));
-    if (adapter != nullptr && is_adapter_on(table, *adapter, node, name)) {
-      use(*adapter);
+  for_each_adapter_of(table, node, [&](Hb_Adapter& adapter) {
+    if (is_adapter_on(adapter, name)) {
+      use(adapter);
     }
-  }
+  });
 }

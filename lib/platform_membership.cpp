@@ -7,29 +7,18 @@
 
 namespace {
 
-bool is_of_node(const Hb_Configuration_Internal& table, const Hb_Adapter& adapter, uint32_t node) {
-  return table.Hb_adapters_per_node > 0 &&
-         adapter.Hb_adapter_num / static_cast<uint32_t>(table.Hb_adapters_per_node) == node;
-}
-
 bool is_same(const Hb_Configuration_Internal& table, const Hb_Adapter& adapter,
              const zu_vex_net_intf_info_t& interface) {
   const char* name = interface.p_name != nullptr ? interface.p_name : "";
-  return is_of_node(table, adapter, interface.node_number) &&
+  return is_adapter_of(table, adapter, interface.node_number) &&
          std::strncmp(adapter.Hb_adapter_type, name, interface_name_length) == 0 &&
          std::memcmp(&adapter.Hb_ip_address, &interface.ip_addr, sizeof interface.ip_addr) == 0;
 }
 
 // Two adapters may have one address, and the table of addresses has one of them. A node has few adapters.
 Hb_Adapter* search_node(const Hb_Configuration_Internal& table, const zu_vex_net_intf_info_t& interface) {
-  const auto slots = static_cast<uint32_t>(table.Hb_adapters_per_node);
-  for (uint32_t slot = 0; slot < slots && slot < HB_MAX_NETWORKS; ++slot) {
-    auto* adapter = static_cast<Hb_Adapter*>(Hash_search(interface.node_number * slots + slot, table.adap_hash));
-    if (adapter != nullptr && is_same(table, *adapter, interface)) {
-      return adapter;
-    }
-  }
-  return nullptr;
+  return find_adapter_of(table, interface.node_number,
+                         [&](const Hb_Adapter& adapter) { return is_same(table, adapter, interface); });
 }
 
 }  // namespace

@@ -4,17 +4,7 @@
 #include "hb_global_data/state.h"
 
 inline void mark_adapters_down_in_waiting_table(uint32_t node) {
-  const Hb_Configuration_Internal& table = global_config_tbl_new;
-  if (node >= HB_MAX_NODES || table.Hb_adapters_per_node <= 0) {
-    return;
-  }
-  const auto slots = static_cast<uint32_t>(table.Hb_adapters_per_node);
-  for (uint32_t slot = 0; slot < slots; ++slot) {
-    auto* adapter = static_cast<Hb_Adapter*>(Hash_search(node * slots + slot, table.adap_hash));
-    if (adapter != nullptr) {
-      adapter->Hb_state = Hb_Entity_Down;
-    }
-  }
+  for_each_adapter_of(global_config_tbl_new, node, [](Hb_Adapter& adapter) { adapter.Hb_state = Hb_Entity_Down; });
 }
 
 inline void mark_node_down_in_waiting_table(uint32_t number, Hb_Entity_State_Reason reason) {

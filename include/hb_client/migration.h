@@ -12,7 +12,8 @@ HB_BEGIN_DECLS
  *
  * @return `Hb_Success`, or `Hb_Failure`: with `HB_EMIGRATE_PREP` (a monitor could not be opened), `HB_EMIGRATE_TBL`
  * (the services do not know a node), or the error number left alone (another number for this node), the monitors are
- * closed again; with `HB_EVEXTBL_BUILD` (the services do not answer) they stay open until hb_migrate_to_vex_abort().
+ * closed again; with `HB_EVEXTBL_BUILD`, `HB_EVEXTBL_ENTRY` or `HB_EVEXTBL_INTF` (the services do not tell of the
+ * cluster, its nodes or its interfaces) they stay open until hb_migrate_to_vex_abort().
  */
 HB_API Hb_Rc hb_migrate_to_vex_prep(void);
 

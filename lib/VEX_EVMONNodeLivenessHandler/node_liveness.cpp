@@ -4,7 +4,8 @@
 #include <memory>
 #include <utility>
 
-#include "VEX_untold_changes.h"
+#include "VEX_EVMONNodeLivenessHandler/changes_of_others.h"
+#include "hb_communication/vex_set_aside_table.h"
 #include "hb_communication/vex_table_build.h"
 #include "vex_outputs.h"
 #include "vex_platform_records.h"
@@ -28,6 +29,14 @@ void trace_report(Trace_Record record, const Report& report) {
               block_of(report.sequence_number), block_of(report.reason_number)});
 }
 
+// Everything of a death or a return that takes memory.
+struct Report_Events {
+  Event configuration;
+  Event node;      // of a death
+  Event adapters;  // of the node, when there are any
+  Changes_Of_Others others;
+};
+
 // One report of a node that went down or came up, and what the tables say of the node before and after it.
 class Node_Change {
  public:
@@ -43,9 +52,13 @@ class Node_Change {
   Hb_Rc deliver_nothing(Hb_Seq_Num seqnum);
   Hb_Rc deliver_stale(Trace_Record record);
   Hb_Rc deliver_repeated();
-  Hb_Rc deliver_death(std::unique_ptr<Hb_VEX_Event> configuration, bool is_node_death_known);
+  Hb_Rc make_death(Report_Events& events, bool is_node_death_known);
+  Hb_Rc make_node_death(Report_Events& events);
+  Hb_Rc make_return(Report_Events& events);
+  Hb_Rc tell_death(Report_Events& events, bool is_node_death_known);
+  Hb_Rc tell_return(Report_Events& events);
+  void deliver_death(Report_Events& events, bool is_node_death_known);
   void deliver_adapters(Hb_Group& adapters);
-  void queue_node_death();
   void deliver_node_death();
   void deliver_new_table();
 
@@ -57,6 +70,7 @@ class Node_Change {
   zu_int32_t node_;
   Hb_Node_config_state* old_ = nullptr;
   const Hb_Node_config_state* new_ = nullptr;
+  bool is_told_ = false;  // the table that was built for it is to take effect
 };
 
 Hb_Rc Node_Change::tell() {
@@ -71,13 +85,17 @@ Hb_Rc Node_Change::tell() {
   if (!is_refreshed) {
     return deliver_nothing(0);
   }
+  Set_Aside_Table older;
   const Hb_Rc rc = rebuild(interfaces.get());
   if (rc != Hb_Success) {
     return rc;
   }
-  hold_back_changes_of_others(global_config_tbl_new, report_.node_number);
   new_ = node_of(global_config_tbl_new, report_.node_number);
-  return report_.event_type == ZU_EVM_EVENT_DOWN ? went_down() : came_up();
+  const Hb_Rc told = report_.event_type == ZU_EVM_EVENT_DOWN ? went_down() : came_up();
+  if (is_told_) {
+    older.keep_new_table();
+  }
+  return told;
 }
 
 Hb_Rc Node_Change::rebuild(zu_vex_net_intf_info_t* interfaces) {
@@ -111,37 +129,59 @@ Hb_Rc Node_Change::went_down() {
   if (was_down && old_->reason != Hb_Entity_State_Reason_BRIXD_Down) {
     return deliver_repeated();
   }
-  // Made first: without it nothing of this is told.
-  std::unique_ptr<Hb_VEX_Event> configuration(VEX_new_configuration_event());
-  return configuration != nullptr ? deliver_death(std::move(configuration), was_down) : Hb_Failure;
+  Report_Events events;
+  return make_death(events, was_down) == Hb_Success ? tell_death(events, was_down) : fail(HB_ENOMEM);
+}
+
+// The adapters come last, as they go down in the table in force with it.
+Hb_Rc Node_Change::make_death(Report_Events& events, bool is_node_death_known) {
+  events.configuration.reset(VEX_new_configuration_event());
+  if (events.configuration == nullptr || events.others.find(handler_, node_, node_) != Hb_Success ||
+      (!is_node_death_known && make_node_death(events) != Hb_Success)) {
+    return Hb_Failure;
+  }
+  Hb_VEX_Event* adapters = nullptr;
+  const Hb_Rc rc = handler_.constructAdapterEventOnNode(node_, &adapters, HB_EVENT_DEATH);
+  events.adapters.reset(adapters);
+  return rc;
+}
+
+Hb_Rc Node_Change::make_node_death(Report_Events& events) {
+  Hb_VEX_Event* death = nullptr;
+  handler_.constructNodeEvent(node_, &death, HB_EVENT_DEATH);
+  events.node.reset(death);
+  if (death == nullptr) {
+    trace(Trace_Info, trace_no_node_death_event);
+    return Hb_Failure;
+  }
+  return Hb_Success;
+}
+
+Hb_Rc Node_Change::tell_death(Report_Events& events, bool is_node_death_known) {
+  is_told_ = true;
+  mark_adapters_down_in_waiting_table(report_.node_number);
+  *out_.events = HB_EVENT_DEATH;
+  deliver_death(events, is_node_death_known);
+  events.others.append_deaths();
+  append_event(std::move(events.configuration));
+  events.others.append_joins();
+  events.adapters = nullptr;
+  return VEX_write_to_event_pipe();
 }
 
 // The death of a node whose group-services daemon was down is known already; its adapters are not.
-Hb_Rc Node_Change::deliver_death(std::unique_ptr<Hb_VEX_Event> configuration, bool is_node_death_known) {
-  Hb_VEX_Event* built = nullptr;
-  const Hb_Rc rc = handler_.constructAdapterEventOnNode(node_, &built, HB_EVENT_DEATH);
-  std::unique_ptr<Hb_VEX_Event> adapters(built);
-  mark_adapters_down_in_waiting_table(report_.node_number);
-  if (adapters == nullptr && rc != Hb_Success) {
-    return Hb_Failure;
-  }
-  *out_.events = HB_EVENT_DEATH;
-  if (adapters != nullptr) {
-    deliver_adapters(adapters->group);
-    if (!is_node_death_known) {
-      queue_node_death();
-    }
+void Node_Change::deliver_death(Report_Events& events, bool is_node_death_known) {
+  if (events.adapters != nullptr) {
+    deliver_adapters(events.adapters->group);
+    append_event(std::move(events.node));
   } else if (!is_node_death_known) {
     deliver_node_death();
+  } else if (events.others.has_deaths()) {
+    deliver_no_event(out_, 0);
   } else {
     deliver_new_table();
-    configuration = nullptr;
+    events.configuration = nullptr;
   }
-  if (configuration != nullptr) {
-    VEX_add_event_at_end(configuration.release());
-  }
-  adapters = nullptr;
-  return VEX_write_to_event_pipe();
 }
 
 void Node_Change::deliver_adapters(Hb_Group& adapters) {
@@ -155,16 +195,6 @@ void Node_Change::deliver_adapters(Hb_Group& adapters) {
   }
   *out_.seqnum = 0;
   handler_.copy_adapter_Hb_Group(&adapters, out_.group);
-}
-
-void Node_Change::queue_node_death() {
-  Hb_VEX_Event* death = nullptr;
-  handler_.constructNodeEvent(node_, &death, HB_EVENT_DEATH);
-  if (death != nullptr) {
-    VEX_add_event_at_end(death);
-  } else {
-    trace(Trace_Info, trace_no_node_death_event);
-  }
 }
 
 void Node_Change::deliver_node_death() {
@@ -194,28 +224,36 @@ Hb_Rc Node_Change::came_up() {
   if (is_in_state(old_, Hb_Entity_Up)) {
     return deliver_repeated();
   }
-  std::unique_ptr<Hb_VEX_Event> configuration(VEX_new_configuration_event());
-  if (configuration == nullptr) {
+  Report_Events events;
+  return make_return(events) == Hb_Success ? tell_return(events) : fail(HB_ENOMEM);
+}
+
+// An adapter of the node that is up in the table in force alone is as one of another node: the return does not name it.
+Hb_Rc Node_Change::make_return(Report_Events& events) {
+  events.configuration.reset(VEX_new_configuration_event());
+  if (events.configuration == nullptr || events.others.find(handler_, VEX_no_node, node_) != Hb_Success) {
     return Hb_Failure;
   }
+  Hb_VEX_Event* adapters = nullptr;
+  const Hb_Rc rc = handler_.constructAdapterEventOnNode(node_, &adapters, HB_EVENT_JOIN);
+  events.adapters.reset(adapters);
+  // Without an answer about its adapters the node is told alone.
+  return rc != Hb_Success && hb_get_errno() == HB_ENOMEM ? Hb_Failure : Hb_Success;
+}
+
+Hb_Rc Node_Change::tell_return(Report_Events& events) {
+  is_told_ = true;
   *out_.events = HB_EVENT_JOIN;
   handler_.fillInNodeEventInfo(node_, HB_EVENT_JOIN, out_.name, out_.group);
   *out_.seqnum = number_of_report();
-  VEX_add_event_at_end(configuration.release());
-  Hb_VEX_Event* adapters = nullptr;
-  handler_.constructAdapterEventOnNode(node_, &adapters, HB_EVENT_JOIN);
-  if (adapters != nullptr) {
-    VEX_add_event_at_end(adapters);
-  }
+  events.others.append_deaths();
+  append_event(std::move(events.configuration));
+  append_event(std::move(events.adapters));
+  events.others.append_joins();
   if (old_ != nullptr) {
     old_->state = Hb_Entity_Up;
   }
   return VEX_write_to_event_pipe();
-}
-
-Hb_Rc cannot_be_read(int read_result, int descriptor) {
-  trace_values(Trace_Errors, trace_node_liveness_read_failed, read_result, errno, descriptor);
-  return Hb_Failure;
 }
 
 }  // namespace
@@ -245,5 +283,5 @@ Hb_Rc EVMONNodeLivenessHandler::read_and_tell(const Vex_Outputs& out) {
     const Monitor_Record<zu_evm_event_split_merge_cfg_t> split_merge(record.p_event_split_merge_cfg);
     return SplitMergeEventHandler(split_merge.get(), out.events, out.name, out.group, out.seqnum);
   }
-  return cannot_be_read(read_result, evmon_fd);
+  return cannot_be_read(trace_node_liveness_read_failed, read_result, errno, evmon_fd);
 }

@@ -29,10 +29,18 @@ bool is_list(const uint32_t* nodes, uint32_t count) {
   return count <= HB_MAX_NODES && (count == 0 || nodes != nullptr);
 }
 
+bool is_split_or_merge(const Report& report) {
+  return report.event_type == ZU_EVM_SUBCLUSTER_SPLIT || report.event_type == ZU_EVM_SUBCLUSTER_MERGE;
+}
+
+bool has_lists(const Report& report) {
+  return is_list(report.local_node_numbers, report.num_local_node_up) &&
+         is_list(report.remote_node_numbers, report.num_remote_node_up);
+}
+
 bool can_be_told(const Report& report) {
   return report.event_subtype != ZU_EVM_SPLITMERGE_EVENT_SUBTYPE_REMOTE &&
-         is_list(report.local_node_numbers, report.num_local_node_up) &&
-         is_list(report.remote_node_numbers, report.num_remote_node_up);
+         (!is_split_or_merge(report) || has_lists(report));
 }
 
 // The array is the C allocator's, as hb_free_split_info() gives it back there. An empty one is a block, too.
@@ -52,12 +60,10 @@ void empty_subclusters(Hb_Split_Merge_Info& info) {
   info.remote_subcluster.num_up_nodes = 0;
 }
 
-// Both lists or none of them.
+// Both lists or none of them. What comes behind the one that there is no memory for stays as it was.
 bool fill_subclusters(Hb_Split_Merge_Info& info, const Report& report) {
-  info.subtype = static_cast<uint32_t>(report.event_subtype);
   if (!fill_subcluster(info.local_subcluster, report.local_node_numbers, report.num_local_node_up)) {
     trace_no_memory(__LINE__);
-    info.remote_subcluster = {};
     return false;
   }
   if (!fill_subcluster(info.remote_subcluster, report.remote_node_numbers, report.num_remote_node_up)) {
@@ -65,6 +71,7 @@ bool fill_subclusters(Hb_Split_Merge_Info& info, const Report& report) {
     empty_subclusters(info);
     return false;
   }
+  info.subtype = static_cast<uint32_t>(report.event_subtype);
   return true;
 }
 
@@ -152,8 +159,8 @@ void head_group(const Vex_Outputs& out) {
 Hb_Rc tell(EVMONHandler& handler, const Report& report, const Vex_Outputs& out) {
   *out.events = events_of(report.event_type);
   Hb_Split_Merge_Info& info = out.group->Hb_membership_grp_union.split_info;
-  if (*out.events != HB_EVENT_NONE && !fill_subclusters(info, report)) {
-    return Hb_Failure;
+  if (is_split_or_merge(report) && !fill_subclusters(info, report)) {
+    return fail(HB_ENOMEM);
   }
   Hb_Rc rc = Hb_Success;
   if (report.event_type == ZU_EVM_SUBCLUSTER_SPLIT) {
@@ -161,7 +168,7 @@ Hb_Rc tell(EVMONHandler& handler, const Report& report, const Vex_Outputs& out) 
     Hb_VEX_Event* death = nullptr;
     if (!mark_nodes_down(handler, report, death)) {
       empty_subclusters(info);
-      return Hb_Failure;
+      return fail(HB_ENOMEM);
     }
     rc = death != nullptr ? queue_deaths(handler, report, *death) : Hb_Success;
   }

@@ -1,5 +1,8 @@
 // The monitor of interfaces: what it tells of one that went down, came up, came or went.
 #include "VEX_EVMONAdapterEventHandler.h"
+
+#include <functional>
+
 #include "monitored_cluster.h"
 #include "support/allocation_faults.h"
 
@@ -21,8 +24,37 @@ class AdapterMonitor : public MonitorTest<EVMONAdapterEventHandler> {
   static zu_evm_event_adapter_liveness_t notification(zu_evm_event_type_t type, uint32_t node, char* interface) {
     return {type, node, 5, 9, 0, interface};
   }
-  Hb_Rc down(uint32_t node, char* interface) { return take(notification(ZU_EVM_EVENT_DOWN, node, interface)); }
-  Hb_Rc up(uint32_t node, char* interface) { return take(notification(ZU_EVM_EVENT_UP, node, interface)); }
+  // What happens to the interface, and the notification of it.
+  Hb_Rc down(uint32_t node, char* interface) {
+    set_status(node, interface, ZU_VEX_INTF_STATUS_DOWN);
+    return take(notification(ZU_EVM_EVENT_DOWN, node, interface));
+  }
+  Hb_Rc up(uint32_t node, char* interface) {
+    set_status(node, interface, ZU_VEX_INTF_STATUS_UP);
+    return take(notification(ZU_EVM_EVENT_UP, node, interface));
+  }
+  static void set_status(uint32_t node, const char* name, zu_vex_intf_status_t status) {
+    for (Scripted_Interface& each : scripted_cluster().interfaces) {
+      if (name != nullptr && each.node == node && each.name == name) each.status = status;
+    }
+  }
+
+  // Node 1024 has en7 twice: under the last number that an event has a place for, and under the next.
+  static void fill_table_of_wide_nodes() {
+    Hb_Configuration_Internal& table = global_config_tbl;
+    table.Hb_max_nodes = 2049;
+    table.Hb_adapters_per_node = 96;
+    table.Hb_num_adapters = 2;
+    table.Hb_global_adapter_list = new Hb_Adapter[2]();
+    table.adap_hash = Hash_init("adapters", 7);
+    for (uint32_t index = 0; index < 2; ++index) {
+      Hb_Adapter& wide = table.Hb_global_adapter_list[index];
+      wide.Hb_adapter_num = 98351 + index;
+      wide.Hb_state = Hb_Entity_Up;
+      std::strcpy(wide.Hb_adapter_type, "en7");
+      Hash_insert(wide.Hb_adapter_num, table.adap_hash, &wide);
+    }
+  }
 
   // The list without members, and the group otherwise as it was.
   bool is_only_list_cleared() const {
@@ -129,6 +161,7 @@ TEST_F(AdapterMonitor, WithARecordThatIsNoneFailsAsAReadDoes) {
 TEST_F(AdapterMonitor, IsArmedForChangesOfTheWholeCluster) {
   const Platform_Question& opened = scripted_cluster().asked.back();
   EXPECT_EQ("BUF_SIZE=1048576;CHANGED=YES;CLUSTER=YES\n", std::string(opened.init_string.c_str()));
+  EXPECT_EQ("BUF_SIZE=1048576;CHANGED=YES;CLUSTER=YES\n", std::string(p_adapterEVMONinitstr));
 }
 
 // Down and up.
@@ -259,6 +292,100 @@ TEST_P(StrangeAdapters, AreOfNoNode) {
 // 89478486 times 48 is 32 beyond what 32 bits hold.
 INSTANTIATE_TEST_SUITE_P(Nodes, StrangeAdapters, testing::Values(9U, 2049U, 65539U, 89478486U, minus_one));
 
+// What the cluster services say.
+
+TEST_F(AdapterMonitor, ADeathOfAnInterfaceThatIsUpIsNoneAnyMore) {
+  EXPECT_EQ(Hb_Success, take(notification(ZU_EVM_EVENT_DOWN, 3, en1)));
+  expect_empty_event();
+  EXPECT_EQ(1U, times_traced(183));
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of_adapter(3, 1));
+}
+
+TEST_F(AdapterMonitor, AReturnOfAnInterfaceThatIsDownIsNoneAnyMore) {
+  Monitored_Client::goes_down(3);
+  Monitored_Client::mark_adapters(3, Hb_Entity_Down);
+  EXPECT_EQ(Hb_Success, take(notification(ZU_EVM_EVENT_UP, 3, en1)));
+  expect_empty_event();
+  EXPECT_EQ(1U, times_traced(183));
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(3, 1));
+}
+
+TEST_F(AdapterMonitor, OfAnInterfaceWhoseStateTheServicesDoNotKnowTheNotificationCounts) {
+  const std::function<void()> unknown[] = {
+      [] { Monitored_Client::interface(3, 1).status = ZU_VEX_INTF_STATUS_STALE; },
+      [] { Monitored_Client::interface(3, 1).status = ZU_VEX_INTF_STATUS_UNDEF; },
+      [] { Monitored_Client::interface(3, 1).status = static_cast<zu_vex_intf_status_t>(77); },
+      [] {
+        platform_double().net_intf_info_after_event.answers.push_back({-1, nullptr, EIO});
+      },
+      [] { Monitored_Client::interface(3, 1).node = 2; },
+      [] { Monitored_Client::interface(3, 1) = {.node = 3, .name = "en0", .address = scripted_address(1, 3, 1)}; },
+      [] { Monitored_Client::interface(3, 1) = {.node = 3, .name = "en1", .address = scripted_address(1, 3, 9)}; },
+      [] {
+        Monitored_Client::interface(3, 1) = {.node = 3, .name = std::nullopt, .address = scripted_address(1, 3, 1)};
+      },
+  };
+  for (const auto& happens : unknown) {
+    Monitored_Client::interface(3, 1) = {.node = 3, .name = "en1", .address = scripted_address(1, 3, 1)};
+    Monitored_Client::mark_adapters(3, Hb_Entity_Up);
+    happens();
+    errno = 77;
+    EXPECT_EQ(Hb_Success, take(notification(ZU_EVM_EVENT_DOWN, 3, en1)));
+    EXPECT_EQ(77, errno);
+    expect_told(1, {adapter(3, 1)});
+  }
+}
+
+TEST_F(AdapterMonitor, OfAnInterfacesAddressesThoseAreLeftThatAreInTheOtherState) {
+  std::strcpy(Monitored_Client::find(3, 1)->Hb_adapter_type, "en0");
+  Monitored_Client::interface(3, 1).name = "en0";
+  Monitored_Client::interface(3, 1).status = ZU_VEX_INTF_STATUS_DOWN;
+  ASSERT_EQ(Hb_Success, hb_vex_update_global_tbl(&global_config_tbl_new, nullptr, &global_config_tbl, nullptr));
+  Monitored_Client::find(3, 1)->Hb_state = Hb_Entity_Up;
+  EXPECT_EQ(Hb_Success, take(notification(ZU_EVM_EVENT_DOWN, 3, en0)));
+  expect_told(1, {adapter(3, 1)});
+  EXPECT_EQ(0U, times_traced(183));
+  Monitored_Client::take_configuration();
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of_adapter(3, 0));
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(3, 1));
+}
+
+TEST_F(AdapterMonitor, AsksForTheInterfacesAsTheNotificationLeavesThem) {
+  int category = -1;
+  uint32_t node = 0;
+  scripted_cluster().at_query_after_event = [&](const zu_evm_event_metadata_t* event) {
+    category = event->category;
+    node = event->event.p_adapter_liveness->node_number;
+  };
+  const size_t before = Scripted_Cluster::outstanding(Platform_Handout::net_intf_info);
+  EXPECT_EQ(Hb_Success, down(3, en1));
+  EXPECT_EQ(1, category);
+  EXPECT_EQ(3U, node);
+  EXPECT_EQ(1U, scripted_cluster().times_asked("zu_vex_get_net_intf_info_after_event"));
+  EXPECT_EQ(before, Scripted_Cluster::outstanding(Platform_Handout::net_intf_info));
+}
+
+TEST_F(AdapterMonitor, WithoutAGroupTellsTheEventAlone) {
+  set_status(3, en1, ZU_VEX_INTF_STATUS_DOWN);
+  scripted_cluster().notify(descriptor(), notification(ZU_EVM_EVENT_DOWN, 3, en1));
+  EXPECT_EQ(Hb_Success, monitor.handler(&out.events, out.name, nullptr, &out.sequence));
+  EXPECT_EQ(1, out.events);
+  EXPECT_EQ("adapters", name());
+  EXPECT_EQ(Hb_Entity_Down, Monitored_Client::state_of_adapter(3, 1));
+  scripted_cluster().notify_result(descriptor(), -1, 0);
+  EXPECT_EQ(Hb_Failure, monitor.handler(&out.events, out.name, nullptr, &out.sequence));
+}
+
+TEST_F(AdapterMonitor, AnAdapterBeyondTheListIsNotCounted) {
+  // 2049 nodes of 96 adapters have more numbers than an event has places.
+  empty_global_config_table(&global_config_tbl);
+  fill_table_of_wide_nodes();
+  EXPECT_EQ(Hb_Success, take(notification(ZU_EVM_EVENT_DOWN, 1024, en7)));
+  EXPECT_EQ(1, out.events);
+  EXPECT_EQ(1, count_of(*out.group));
+  EXPECT_THAT(adapters_of(*out.group), ElementsAre(98351U));
+}
+
 // Coming and going.
 
 TEST_F(AdapterMonitor, AnAliasInterfaceIsTheAliasEventAlone) {
@@ -321,6 +448,7 @@ TEST_F(AdapterMonitor, KeepsNoneOfTheListsItAskedFor) {
 
 TEST_F(AdapterMonitor, NeedsNoMemoryForWhatWentDown) {
   scripted_cluster().notify(descriptor(), notification(ZU_EVM_EVENT_DOWN, 3, en1));
+  platform_double().net_intf_info_after_event.answers.push_back({-1, nullptr});
   Monitored_Client::trace_nothing();
   Hb_Rc rc = Hb_Failure;
   {

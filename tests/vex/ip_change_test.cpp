@@ -118,6 +118,7 @@ TEST_F(IPChange, WithARecordThatIsNoneFailsAsAReadDoes) {
 TEST_F(IPChange, IsArmedForChangesOfTheWholeCluster) {
   const Platform_Question& opened = scripted_cluster().asked.back();
   EXPECT_EQ("BUF_SIZE=1048576;CHANGED=YES;CLUSTER=YES\n", std::string(opened.init_string.c_str()));
+  EXPECT_EQ("BUF_SIZE=1048576;CHANGED=YES;CLUSTER=YES\n", std::string(p_ipchangeEVMONinitstr));
 }
 
 TEST_F(IPChange, RecordsWhatWasRead) {
@@ -198,6 +199,21 @@ TEST_F(IPChange, AnAddressThatIsKnownAndGoesIsTakenFromTheTableWithItsDeath) {
 TEST_F(IPChange, AnAliasAddressThatGoesIsTheAliasEventAlone) {
   EXPECT_EQ(Hb_Success, deleted(3, en1, alias));
   expect_alias_alone();
+}
+
+TEST_F(IPChange, AnAddressThatIsInTheTableInForceAloneAndGoesIsAChange) {
+  disappears(3, 1);
+  ASSERT_EQ(Hb_Success, hb_vex_update_global_tbl(&global_config_tbl_new, nullptr, &global_config_tbl, nullptr));
+  EXPECT_EQ(Hb_Success, deleted(3, en1, known));
+  EXPECT_EQ(1U, times_traced(233));
+  EXPECT_THAT(adapters_of(*out.group), ElementsAre(adapter(3, 1)));
+}
+
+TEST_F(IPChange, AnAddressThatIsInTheWaitingTableAloneAndGoesIsAChange) {
+  const zu_vex_IP_address6_t address = new_boot_address();
+  ASSERT_EQ(Hb_Success, hb_vex_update_global_tbl(&global_config_tbl_new, nullptr, &global_config_tbl, nullptr));
+  EXPECT_EQ(Hb_Success, deleted(3, en1, address));
+  EXPECT_EQ(1U, times_traced(233));
 }
 
 TEST_F(IPChange, ABootAddressThatHasGoneAndGoesIsRepeated) {

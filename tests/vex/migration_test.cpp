@@ -155,7 +155,6 @@ TEST_F(Migration, OfAPreparationOneTableStaysAndNothingElse) {
   EXPECT_EQ(handed_out_before, Scripted_Cluster::outstanding());
 }
 
-// A pipe's label is all that can be missing of what a preparation makes.
 TEST_F(Migration, WithoutMemoryAPreparationFailsOrIsWholeAndTheDaemonIsKept) {
   Monitored_Client::trace_nothing();
   size_t failures = 0;

@@ -40,10 +40,14 @@ struct Queued_Event {
   Hb_Events events = 0;
   std::set<uint32_t> members = {};  // nodes or adapters, by the group's kind
   int32_t count = 0;
+  int32_t status = Hb_Group_Stable;
+  uint32_t type = VEX_Deliver;
+  uint32_t node = 0;
 
   bool operator==(const Queued_Event&) const = default;
   friend std::ostream& operator<<(std::ostream& out, const Queued_Event& event) {
-    out << "events " << event.events << ", " << event.count << ":";
+    out << "events " << event.events << ", status " << event.status << ", type " << event.type << " of node "
+        << event.node << ", " << event.count << ":";
     for (const uint32_t member : event.members) out << ' ' << member;
     return out;
   }
@@ -165,7 +169,10 @@ class Monitored_Client {
   static std::vector<Queued_Event> queue() {
     std::vector<Queued_Event> events;
     for (const Hb_VEX_Event* event = event_queue_list; event != nullptr; event = event->next) {
-      events.push_back({event->group.Hb_events});
+      events.push_back({.events = event->group.Hb_events,
+                        .status = event->group.Hb_group_status,
+                        .type = event->type,
+                        .node = event->node_num});
       if (event->group.Hb_group_type == Hb_Node_Group) {
         events.back().members = nodes_of(event->group);
         events.back().count = count_of(event->group);

@@ -1,4 +1,6 @@
 // Splits and merges of the cluster: both parts for the caller, and the deaths of the other one.
+#include <fcntl.h>
+
 #include <cstdlib>
 
 #include "VEX_EVMONNodeLivenessHandler.h"
@@ -189,6 +191,18 @@ TEST_F(SplitMerge, FailsWhenTheCallerCannotBeWokenAndTellsTheSplitAllTheSame) {
   EXPECT_EQ(3U, Monitored_Client::queue().size());
 }
 
+TEST_F(SplitMerge, FailsWhenThePipeCannotBeWrittenAndTellsTheSplitAllTheSame) {
+  const int unwritable = open("/dev/null", O_RDONLY | O_CLOEXEC);
+  ASSERT_EQ(client.pipe_handler->getWriteFd(), dup2(unwritable, client.pipe_handler->getWriteFd()));
+  close(unwritable);
+  EXPECT_EQ(Hb_Failure, split());
+  EXPECT_EQ(EBADF, errno);
+  EXPECT_EQ(59, hb_get_errno());
+  EXPECT_EQ(4096, out.events);
+  expect_parts({1, 2}, {4, 3});
+  EXPECT_EQ(3U, Monitored_Client::queue().size());
+}
+
 // Merges and other records.
 
 TEST_F(SplitMerge, AMergeGivesBothPartsAndChangesNoNode) {
@@ -230,6 +244,28 @@ TEST_F(SplitMerge, OfAnyOtherTypeFillsNoLists) {
   expect_all_up();
 }
 
+TEST_F(SplitMerge, OfAnyOtherTypeIsNotRefusedForItsLists) {
+  auto record = report(ZU_EVM_EVENT_UP);
+  record.local_node_numbers = record.remote_node_numbers = nullptr;
+  EXPECT_EQ(Hb_Success, tell(record));
+  record.num_local_node_up = record.num_remote_node_up = minus_one;
+  EXPECT_EQ(Hb_Success, tell(record));
+  has_lists = false;
+  EXPECT_EQ(5U, out.sequence);
+  EXPECT_EQ("splits", name());
+  EXPECT_EQ(0x5A5A5A5AU, info_of().subtype);
+}
+
+TEST_F(SplitMerge, OfASubtypeThatNobodyKnowsIsToldWithIt) {
+  auto record = report(ZU_EVM_SUBCLUSTER_SPLIT);
+  record.event_subtype = static_cast<zu_evm_splitmerge_event_subtype_t>(7);
+  EXPECT_EQ(Hb_Success, tell(record));
+  EXPECT_EQ(4096, out.events);
+  EXPECT_EQ(7U, info_of().subtype);
+  EXPECT_EQ(2U, info_of().remote_subcluster.num_up_nodes);
+  EXPECT_THAT(Monitored_Client::state_of(3), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_LOCAL_SPLIT_Down));
+}
+
 TEST_F(SplitMerge, OfTheOtherPartIsRefusedBehindItsSequenceNumber) {
   auto record = report(ZU_EVM_SUBCLUSTER_SPLIT);
   record.event_subtype = ZU_EVM_SPLITMERGE_EVENT_SUBTYPE_REMOTE;
@@ -256,6 +292,36 @@ TEST_F(SplitMerge, RecordsItsStepsInTheirOrder) {
   EXPECT_THAT(sizes_of(256), ElementsAre(4, 4, 4, 4, 4, 8, 4, 4));
 }
 
+TEST_F(SplitMerge, RecordsNodesThatAreUnknownOrNotUp) {
+  Monitored_Client::mark(4, Hb_Entity_Undef, Hb_Entity_State_Reason_Down);
+  remote = {99, 4};
+  split();
+  EXPECT_EQ(info, platform_double().traces_of(265).at(0).category);
+  EXPECT_EQ(info, platform_double().traces_of(264).at(0).category);
+  EXPECT_THAT(numbers_of(264), ElementsAre(4, static_cast<uint64_t>(Hb_Entity_Undef)));
+  EXPECT_THAT(numbers_of(265), ElementsAre(99));
+}
+
+TEST_F(SplitMerge, OfNodesThatAreUnknownOrNotUpIsToldWithoutTraceAsWell) {
+  Monitored_Client::mark(4, Hb_Entity_Down, Hb_Entity_State_Reason_STOPPED_Down);
+  Monitored_Client::trace_nothing();
+  remote = {99, 4};
+  EXPECT_EQ(Hb_Success, split());
+  expect_parts({1, 2}, {99, 4});
+  EXPECT_THAT(Monitored_Client::queue(), IsEmpty());
+  EXPECT_THAT(traced(), IsEmpty());
+}
+
+TEST_F(SplitMerge, ThatIsToldKeepsTheSystemsErrorNumber) {
+  platform_double().errno_after_trace = 5;
+  errno = 77;
+  EXPECT_EQ(Hb_Success, split());
+  EXPECT_EQ(77, errno);
+  hb_free_split_info(&info_of());
+  EXPECT_EQ(Hb_Success, merge());
+  EXPECT_EQ(77, errno);
+}
+
 TEST_F(SplitMerge, KeepsTheSystemsErrorNumber) {
   platform_double().errno_after_trace = 5;
   auto record = report(ZU_EVM_SUBCLUSTER_SPLIT);
@@ -277,12 +343,22 @@ class SplitMergeMemory : public SplitMerge, public testing::WithParamInterface<i
     has_lists = false;
     return rc;
   }
+  // What comes behind the list that there is no memory for is as it was.
+  void expect_no_list() {
+    const Hb_Split_Merge_Info info = info_of();
+    EXPECT_EQ(nullptr, info.local_subcluster.node_numbers);
+    EXPECT_EQ(0U, info.local_subcluster.num_up_nodes);
+    const bool first = GetParam() == 1;
+    EXPECT_EQ(first ? 0x5A5A5A5A5A5A5A5A : 0, reinterpret_cast<uintptr_t>(info.remote_subcluster.node_numbers));
+    EXPECT_EQ(first ? 0x5A5A5A5AU : 0U, info.remote_subcluster.num_up_nodes);
+    EXPECT_EQ(0x5A5A5A5AU, info.subtype);
+  }
 };
 
 TEST_P(SplitMergeMemory, WithoutItASplitFailsAndChangesNothing) {
   EXPECT_EQ(Hb_Failure, tell_without_memory(ZU_EVM_SUBCLUSTER_SPLIT));
-  EXPECT_EQ(nullptr, info_of().local_subcluster.node_numbers);
-  EXPECT_EQ(nullptr, info_of().remote_subcluster.node_numbers);
+  EXPECT_EQ(17, hb_get_errno());
+  expect_no_list();
   EXPECT_EQ(5U, out.sequence);
   expect_all_up();
   EXPECT_THAT(traced(), ElementsAre(Pair(254U, info), Pair(256U, info), Pair(262U, errors), Pair(255U, info)));
@@ -294,9 +370,16 @@ TEST_P(SplitMergeMemory, WithoutItASplitFailsAndChangesNothing) {
 
 TEST_P(SplitMergeMemory, WithoutItAMergeFailsWithNothingInTheGroup) {
   EXPECT_EQ(Hb_Failure, tell_without_memory(ZU_EVM_SUBCLUSTER_MERGE));
-  EXPECT_EQ(nullptr, info_of().local_subcluster.node_numbers);
-  EXPECT_EQ(nullptr, info_of().remote_subcluster.node_numbers);
+  EXPECT_EQ(17, hb_get_errno());
+  expect_no_list();
   EXPECT_EQ(1U, times_traced(262));
+}
+
+TEST_P(SplitMergeMemory, WithoutItFailsWithoutTraceAsWell) {
+  Monitored_Client::trace_nothing();
+  EXPECT_EQ(Hb_Failure, tell_without_memory(ZU_EVM_SUBCLUSTER_SPLIT));
+  EXPECT_EQ(ENOMEM, errno);
+  EXPECT_THAT(traced(), IsEmpty());
 }
 
 INSTANTIATE_TEST_SUITE_P(FirstAndSecondList, SplitMergeMemory, testing::Values(1, 2));
@@ -309,9 +392,23 @@ TEST_F(SplitMerge, WithoutMemoryForTheDeathFailsAndMarksNobody) {
     EXPECT_TRUE(failure.happened());
   }
   has_lists = false;
+  EXPECT_EQ(17, hb_get_errno());
   EXPECT_EQ(nullptr, info_of().local_subcluster.node_numbers);
   EXPECT_EQ(nullptr, info_of().remote_subcluster.node_numbers);
   expect_all_up();
+}
+
+TEST_F(SplitMerge, WithoutMemoryForTheAdaptersOfANodeFailsAndTellsTheOthers) {
+  Monitored_Client::trace_nothing();
+  {
+    const AllocationFailure failure(2);
+    EXPECT_EQ(Hb_Failure, split());
+    EXPECT_TRUE(failure.happened());
+  }
+  EXPECT_EQ(17, hb_get_errno());
+  EXPECT_THAT(Monitored_Client::queue(),
+              ElementsAre(Queued_Event{1, {3, 4}, 2}, Queued_Event{1, {adapter(3, 0), adapter(3, 1)}, 2}));
+  EXPECT_EQ(Hb_Entity_Up, Monitored_Client::state_of_adapter(4, 0));
 }
 
 // Records as no platform should make them.
