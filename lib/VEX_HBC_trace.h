@@ -103,19 +103,3 @@ inline Trace_Block block_of_text(const char* text) {
   const char* shown = text != nullptr ? text : "";
   return {shown, static_cast<uint32_t>(std::strlen(shown) + 1)};
 }
-
-inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a, Trace_Block b) {
-  if (trace_is_on(category)) {
-    const Errno_Kept kept;
-    tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], 2, a.bytes, a.length, b.bytes, b.length);
-  }
-}
-
-inline void trace_data(Trace_Category category, Trace_Record record, Trace_Block a, Trace_Block b, Trace_Block c,
-                       Trace_Block d) {
-  if (trace_is_on(category)) {
-    const Errno_Kept kept;
-    tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], 4, a.bytes, a.length, b.bytes, b.length,
-                        c.bytes, c.length, d.bytes, d.length);
-  }
-}

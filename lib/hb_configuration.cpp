@@ -115,7 +115,7 @@ Hb_Rc process_site_number_list(Hb_Site_Number* site, Hb_Cursor* cursor, int tran
 [[gnu::cold, gnu::noinline]] void trace_address(Hb_IP_address6* address, Hb_Adapter_Number adapter) {
   char text[INET6_ADDRSTRLEN];
   mowllib_ntop(address, text);
-  trace_data(Trace_Info, trace_address_of_adapter, {text, text_length(text)}, {&adapter, sizeof adapter});
+  trace_data(Trace_Info, trace_address_of_adapter, {{text, text_length(text)}, {&adapter, sizeof adapter}});
 }
 
 Hb_Rc get_number(int value, int* number) {
@@ -228,8 +228,8 @@ Hb_Rc hb_get_adapter_type_by_number(Hb_Adapter_Number adapter, char* adapter_typ
     return Hb_Failure;
   }
   copy_text(adapter_type, record->Hb_adapter_type);
-  trace_data(Trace_Info, trace_type_of_adapter, {record->Hb_adapter_type, text_length(record->Hb_adapter_type)},
-             {&adapter, sizeof adapter});
+  trace_data(Trace_Info, trace_type_of_adapter,
+             {{record->Hb_adapter_type, text_length(record->Hb_adapter_type)}, {&adapter, sizeof adapter}});
   return Hb_Success;
 }
 

@@ -56,7 +56,7 @@ HB_STATIC_ASSERT(offsetof(Hb_Site, Hb_state) == 4, "site state at 4");
  * end they fail with `HB_ENOMORE`, store the "none" value and leave the cursor, so that a next call keeps failing.
  */
 
-/** Number of nodes that have a configured adapter. */
+/** Number of configured nodes: those that have a configured adapter, and in VEX mode all nodes of the cluster. */
 HB_API Hb_Rc hb_get_number_of_configured_nodes(int* nodes);
 
 /** Number of configured adapters. */
@@ -137,7 +137,8 @@ HB_API Hb_Rc hb_get_network_name_by_number(Hb_Network_Number network, char* name
  */
 HB_API Hb_Rc hb_get_network_type_by_number(Hb_Network_Number network, char* type);
 
-/** First node that has a configured adapter, ascending; `HB_NO_NODE` and `HB_ENOMORE` at the end. */
+/** First configured node, ascending, as hb_get_number_of_configured_nodes() counts them; `HB_NO_NODE` and `HB_ENOMORE`
+ * at the end. */
 HB_API Hb_Rc hb_get_first_configured_node_number(Hb_Node_Number* node, Hb_Cursor* cursor);
 /** See hb_get_first_configured_node_number(). */
 HB_API Hb_Rc hb_get_next_configured_node_number(Hb_Node_Number* node, Hb_Cursor* cursor);

@@ -81,7 +81,7 @@ HB_API Hb_Rc hb_empty_subscription_group(Hb_Subscription_Group* group);
 /** Makes it a group of every configured adapter. */
 HB_API Hb_Rc hb_add_all_adapters_to_subscription_group(Hb_Subscription_Group* group);
 
-/** Makes it a group of every node that has a configured adapter. */
+/** Makes it a group of every configured node, as hb_get_number_of_configured_nodes() counts them. */
 HB_API Hb_Rc hb_add_all_nodes_to_subscription_group(Hb_Subscription_Group* group);
 
 /** Makes it a group of every configured site. */

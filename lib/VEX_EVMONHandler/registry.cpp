@@ -69,7 +69,7 @@ bool make_room() {
 
 void trace_not_registered(const char* path, int descriptor) {
   if (path != nullptr) {
-    trace_data(Trace_Errors, trace_monitor_not_registered, block_of_text(path), block_of(descriptor));
+    trace_data(Trace_Errors, trace_monitor_not_registered, {block_of_text(path), block_of(descriptor)});
   } else {
     trace_values(Trace_Errors, trace_handler_not_registered, descriptor);
   }
@@ -107,7 +107,7 @@ int32_t EVMONHandler::open_and_register(char* fname, const char* p_initstr) {
     evmon_fname = nullptr;
     return rc;
   }
-  trace_data(Trace_Info, trace_monitor_opened, block_of_text(evmon_fname), block_of(evmon_fd));
+  trace_data(Trace_Info, trace_monitor_opened, {block_of_text(evmon_fname), block_of(evmon_fd)});
   selfRegister();
   return rc;
 }

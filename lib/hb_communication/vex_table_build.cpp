@@ -120,8 +120,8 @@ void trace_insertion(Trace_Record record, Hb_Adapter& adapter) {
   if (trace_is_on(Trace_Debug)) {
     const Errno_Kept kept;
     char address[INET6_ADDRSTRLEN];
-    trace_data(Trace_Debug, record, block_of_text(mowllib_ntop(&adapter.Hb_ip_address, address)),
-               block_of(adapter.Hb_adapter_num));
+    trace_data(Trace_Debug, record,
+               {block_of_text(mowllib_ntop(&adapter.Hb_ip_address, address)), block_of(adapter.Hb_adapter_num)});
   }
 }
 

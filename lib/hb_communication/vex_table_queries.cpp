@@ -64,8 +64,8 @@ Hb_Rc ask_or_take_interfaces(Table_Answers& answers, const zu_evm_event_metadata
 Hb_Rc fail_table_build(Trace_Block call, int result, int system_error, int library_error) {
   static constexpr char variant[] = "(Default)";
   set_hb_errno(library_error);
-  trace_data(Trace_Errors, trace_table_query_failed, call, {variant, sizeof variant}, block_of(result),
-             block_of(system_error));
+  trace_data(Trace_Errors, trace_table_query_failed,
+             {call, {variant, sizeof variant}, block_of(result), block_of(system_error)});
   return Hb_Failure;
 }
 

@@ -27,7 +27,9 @@ extern int32_t global_hb_errno;
 
 extern Hb_Configuration_Internal global_config_tbl;
 extern Hb_Configuration_Internal global_config_tbl_new;  // where VEX mode rebuilds before it compares
-extern Hb_Boolean global_node_tbl[HB_MAX_NODES];         // node has at least one configured adapter
+// Which nodes are configured, and how many: in daemon mode those that have an adapter, in VEX mode all of the cluster,
+// as of the last table that was built.
+extern Hb_Boolean global_node_tbl[HB_MAX_NODES];
 extern int32_t global_num_nodes;
 extern Hb_Boolean global_site_tbl[HB_MAX_SITES];
 extern int32_t global_num_sites;

@@ -50,7 +50,7 @@ typedef struct zu_vex_hwaddr_t {
 /** One interface address of one node; a linked list. */
 typedef struct zu_vex_net_intf_info {
   zu_vex_node_num_t node_number;
-  zu_vex_intf_name_t p_name; /**< at most 32 characters count */
+  zu_vex_intf_name_t p_name; /**< 32 characters are compared, 35 get into a table; it ends, or 255 can be read */
   zu_vex_IP_address6_t ip_addr;
   zu_vex_IP_address6_t netmask;
   uint64_t flags;
@@ -126,13 +126,14 @@ struct zu_evm_event_metadata_t;
 
 /*
  * Each query returns 0 and hands out what it found, or another value and leaves the output alone. A platform without
- * cluster services yields -1. An empty list is null. What is handed out belongs to the library, whole, until it gives it
- * back with the function of its kind below. It sets and clears ZU_VEX_INTF_ALIAS in it.
+ * cluster services yields -1. An empty list is null. What is handed out belongs to the library, whole, until it gives
+ * it back with the function of its kind below. It sets and clears ZU_VEX_INTF_ALIAS in it. A list ends with a null
+ * p_next; of one that does not, 393,408 addresses or 32,784 nodes are looked at.
  *
  * Records of clusters and nodes come back at once, and so do interfaces when the table that they are for is built. Boot
- * addresses, and the interfaces of a start, are kept until boot addresses are read anew; those of a start that failed
- * never come back, nor does the list of interfaces that a client moves to VEX mode with. What the library copies is
- * never given back here.
+ * addresses, and the interfaces of a start, are kept until boot addresses are read anew or the next start; those of a
+ * start that failed never come back, nor does the list of interfaces that a client moves to VEX mode with. What the
+ * library copies is never given back here.
  */
 int zu_vex_get_cluster_info(zu_vex_cluster_info_t** info);
 
