@@ -424,6 +424,17 @@ TEST_F(AdapterMonitor, ABootInterfaceThatCameIsInTheTableWithItsJoin) {
   EXPECT_EQ(Hb_Entity_Up, Monitored_Client::find(3, 2)->Hb_state);
 }
 
+TEST_F(AdapterMonitor, OfAClientThatGaveUpMovingQueuesEverythingAndDeliversNothing) {
+  migrate_to_vex_prep = true;
+  scripted_cluster().interfaces.erase(scripted_cluster().interfaces.begin() + 5);
+  EXPECT_EQ(Hb_Success, take(notification(ZU_EVM_EVENT_DELETE, 3, en1)));
+  EXPECT_EQ(0, out.events);
+  EXPECT_EQ("<EMPTY EVENT>", name());
+  EXPECT_EQ(0U, out.sequence);
+  EXPECT_THAT(adapters_of(*out.group), IsEmpty());
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(Queued_Event{1, {adapter(3, 1)}, 1}, configuration_event));
+}
+
 TEST_F(AdapterMonitor, WhoseInterfacesCannotBeListedFails) {
   platform_double().net_intf_info.answers.push_back({-1, nullptr});
   EXPECT_EQ(Hb_Failure, take(notification(ZU_EVM_EVENT_ADD, 3, en1)));

@@ -68,7 +68,48 @@ class ClusterLife : public testing::Test {
     EXPECT_EQ(life->configured_adapters(), life->without_aliases(caller.configured_adapters));
     EXPECT_EQ(life->adapters_up(), life->without_aliases(caller.adapters_up));
     EXPECT_EQ(0, caller.unknown_adapters);
+    expect_true_states();
   }
+
+  // What the library itself says of each node and of each adapter.
+  void expect_true_states() const {
+    std::set<int> up;
+    for (const int node : caller.configured_nodes) {
+      Hb_Entity_State state = Hb_Entity_Undef;
+      Hb_Entity_State_Reason reason = Hb_Entity_State_Reason_Down;
+      EXPECT_EQ(Hb_Success, hb_get_node_status_reason(static_cast<Hb_Node_Number>(node), &state, &reason));
+      if (state == Hb_Entity_Up) up.insert(node);
+      const bool is_reason_of_up = reason == Hb_Entity_State_Reason_Up || reason == Hb_Entity_State_Reason_BRIXD_Up;
+      EXPECT_EQ(state == Hb_Entity_Up, is_reason_of_up) << "node " << node << ", reason " << reason;
+    }
+    EXPECT_EQ(life->nodes_up(), up);
+    std::set<Known_Adapter> adapters_up;
+    for (int i = 0; i < global_config_tbl.Hb_num_adapters; ++i) {
+      const Hb_Adapter& adapter = global_config_tbl.Hb_global_adapter_list[i];
+      if (adapter.Hb_state == Hb_Entity_Up) adapters_up.insert(known(adapter));
+    }
+    EXPECT_EQ(life->adapters_up(), life->without_aliases(adapters_up));
+  }
+
+  static Known_Adapter known(const Hb_Adapter& adapter) {
+    return {static_cast<int>(adapter.Hb_adapter_num) / global_config_tbl.Hb_adapters_per_node, adapter.Hb_adapter_type,
+            hexadecimal(&adapter.Hb_ip_address, sizeof adapter.Hb_ip_address)};
+  }
+
+  // Everyone that the events of one kind named, by "node" or "node/interface".
+  std::set<std::string> everyone_told(Hb_Events kind) const {
+    std::set<std::string> all;
+    for (const Taken_Event& event : told) {
+      if (event.events != kind) continue;
+      for (const int node : event.nodes) all.insert(std::to_string(node));
+      for (const Known_Adapter& adapter : event.adapters) {
+        all.insert(std::to_string(adapter.node) + '/' + adapter.type);
+      }
+    }
+    return all;
+  }
+  std::set<std::string> deaths() const { return everyone_told(HB_EVENT_DEATH); }
+  std::set<std::string> joins() const { return everyone_told(HB_EVENT_JOIN); }
 
   template <typename Step>
   void after(const char* what, Step step) {
@@ -197,6 +238,8 @@ TEST_F(ClusterLife, ReportsThatPileUpAreTakenOneByOne) {
   expect_true_picture();
 }
 
+// Two things that happen before the program takes an event.
+
 TEST_F(ClusterLife, WhatHappensAtOnceIsToldWithoutALoss) {
   start();
   life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE);
@@ -204,6 +247,8 @@ TEST_F(ClusterLife, WhatHappensAtOnceIsToldWithoutALoss) {
   life->interface_dies(4, "en1");
   life->remove_boot_address(5, 0);
   take();
+  EXPECT_THAT(deaths(), ElementsAre("2", "2/en0", "2/en1", "3", "3/en0", "3/en1", "4/en1", "5/en0"));
+  EXPECT_THAT(joins(), IsEmpty());
   expect_true_picture();
   life->node_returns(3);
   life->node_dies(6, ZU_VEX_NODE_DOWN_REASON_NONE);
@@ -211,6 +256,92 @@ TEST_F(ClusterLife, WhatHappensAtOnceIsToldWithoutALoss) {
   life->add_boot_address(5, 0);
   life->node_returns(2);
   take();
+  EXPECT_THAT(deaths(), ElementsAre("6", "6/en0", "6/en1"));
+  EXPECT_THAT(joins(), ElementsAre("2", "2/en0", "2/en1", "3", "3/en0", "3/en1", "4/en1", "5/en0"));
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, ABootAddressThatGoesBesideADeathIsToldWithIt) {
+  start();
+  life->remove_boot_address(5, 1);
+  life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE);
+  take();
+  EXPECT_THAT(deaths(), ElementsAre("2", "2/en0", "2/en1", "5/en1"));
+  EXPECT_THAT(joins(), IsEmpty());
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, ANodeThatIsRemovedBesideADeathIsToldWithIt) {
+  start();
+  life->remove_node(7);
+  life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE);
+  take();
+  EXPECT_THAT(deaths(), ElementsAre("2", "2/en0", "2/en1", "7", "7/en0", "7/en1"));
+  EXPECT_THAT(joins(), IsEmpty());
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, ANewNodeThatNobodyReportsIsToldWithTheDeathBesideIt) {
+  start();
+  life->configure_node(9);
+  life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE);
+  take();
+  EXPECT_THAT(deaths(), ElementsAre("2", "2/en0", "2/en1"));
+  EXPECT_THAT(joins(), ElementsAre("9", "9/en0", "9/en1"));
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, AnAddressThatMovesToAnotherNodeBesideADeathIsToldWithIt) {
+  start();
+  life->move_boot_address(4, 0, 5);
+  life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE);
+  take();
+  EXPECT_THAT(deaths(), ElementsAre("2", "2/en0", "2/en1", "4/en0"));
+  EXPECT_THAT(joins(), ElementsAre("5/en0"));
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, NodesThatASplitTookReturnWithTheReportOfAnother) {
+  start();
+  life->split_off({6, 7});
+  life->merge({6, 7});
+  life->heal({6, 7});
+  life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE);
+  take();
+  EXPECT_THAT(deaths(), ElementsAre("2", "2/en0", "2/en1", "6", "6/en0", "6/en1", "7", "7/en0", "7/en1"));
+  EXPECT_THAT(joins(), ElementsAre("6", "6/en0", "6/en1", "7", "7/en0", "7/en1"));
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, AnInterfaceThatReturnedBeforeItsNodeDiedDoesNotJoin) {
+  start();
+  after("an interface goes", [&] { life->interface_dies(3, "en1"); });
+  life->interface_returns(3, "en1");
+  life->node_dies(3, ZU_VEX_NODE_DOWN_REASON_NONE);
+  take();
+  EXPECT_THAT(deaths(), ElementsAre("3", "3/en0"));
+  EXPECT_THAT(joins(), IsEmpty());
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, AnInterfaceThatWentBeforeItsNodeDiedAndReturnedDoesNotDie) {
+  start();
+  life->interface_dies(3, "en1");
+  life->node_dies(3, ZU_VEX_NODE_DOWN_REASON_NONE);
+  life->node_returns(3);
+  take();
+  EXPECT_THAT(told, IsEmpty());
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, AnInterfaceThatGoesWhenItsNodeHasReturnedIsToldOnce) {
+  start();
+  after("a death", [&] { life->node_dies(3, ZU_VEX_NODE_DOWN_REASON_NONE); });
+  life->node_returns(3);
+  life->interface_dies(3, "en1");
+  take();
+  EXPECT_THAT(deaths(), IsEmpty());
+  EXPECT_THAT(joins(), ElementsAre("3", "3/en0"));
   expect_true_picture();
 }
 
@@ -319,7 +450,13 @@ void ClusterLife::configuration_changes() {
   life->configure_node(9);
   after("a new node", [&] { life->report_node(9, ZU_EVM_EVENT_UP); });
   after("the new node's death", [&] { life->node_dies(9, ZU_VEX_NODE_DOWN_REASON_SHUTDOWN); });
+  // Nobody tells of the removal alone: the node stays what it was, and leaves with the next report.
   life->remove_node(9);
+  take();
+  EXPECT_THAT(told, IsEmpty());
+  EXPECT_TRUE(caller.configured_nodes.contains(9));
+  EXPECT_EQ(life->nodes_up(), caller.nodes_up);
+  EXPECT_EQ(life->adapters_up(), life->without_aliases(caller.adapters_up));
   after("another's death behind the removal", [&] { life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE); });
   after("another's return", [&] { life->node_returns(2); });
 }

@@ -186,6 +186,14 @@ void Scripted_Life::remove_boot_address(uint32_t node, unsigned interface) {
   report_address(node, name_of(interface), boot_address(node, interface), ZU_EVM_ADDRESS_DELETE);
 }
 
+void Scripted_Life::move_boot_address(uint32_t from, unsigned interface, uint32_t to) {
+  const zu_vex_IP_address6_t address = boot_address(from, interface);
+  erase(from, address);
+  insert({.node = to, .name = name_of(interface), .address = address});
+  report_address(from, name_of(interface), address, ZU_EVM_ADDRESS_DELETE);
+  report_address(to, name_of(interface), address, ZU_EVM_ADDRESS_ADD);
+}
+
 void Scripted_Life::change_address(uint32_t node, unsigned interface, const zu_vex_IP_address6_t& address) {
   for (Scripted_Interface& present : scripted_cluster().interfaces) {
     if (present.node == node && present.name == name_of(interface) && !aliases_.contains(text_of(present.address))) {
@@ -219,6 +227,14 @@ void Scripted_Life::split_off(const std::set<uint32_t>& other_part) {
 
 void Scripted_Life::merge(const std::set<uint32_t>& other_part) {
   notify_split_merge(ZU_EVM_SUBCLUSTER_MERGE, other_part);
+}
+
+void Scripted_Life::heal(const std::set<uint32_t>& other_part) {
+  for (const uint32_t number : other_part) {
+    node(number).status = ZU_VEX_NODE_STATUS_UP;
+    node(number).reason = ZU_VEX_NODE_DOWN_REASON_NONE;
+    set_interfaces(number, ZU_VEX_INTF_STATUS_UP);
+  }
 }
 
 void Scripted_Life::notify_split_merge(zu_evm_event_type_t type, const std::set<uint32_t>& other_part) {

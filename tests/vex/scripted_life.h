@@ -37,6 +37,7 @@ class Scripted_Life {
   void remove_alias(uint32_t node, const std::string& name, const zu_vex_IP_address6_t& address);
   void add_boot_address(uint32_t node, unsigned interface);
   void remove_boot_address(uint32_t node, unsigned interface);
+  void move_boot_address(uint32_t from, unsigned interface, uint32_t to);  // to the interface of that name
   void change_address(uint32_t node, unsigned interface, const zu_vex_IP_address6_t& address);
   void report_address(uint32_t node, const std::string& name, const zu_vex_IP_address6_t& address,
                       zu_evm_event_type_t type);  // without a change
@@ -44,6 +45,7 @@ class Scripted_Life {
   // The nodes of the other part go, and come back one by one.
   void split_off(const std::set<uint32_t>& other_part);
   void merge(const std::set<uint32_t>& other_part);
+  void heal(const std::set<uint32_t>& other_part);  // back at once, and unreported
 
   // One notification each of the monitors that tell nothing of members.
   void report_site();
