@@ -374,7 +374,8 @@ def scenarios():
 
 
 def vex_days():
-    """Steps of targets/vex_notifications.cpp: changes, notifications, calls, taking one or everything."""
+    """Steps of targets/vex_notifications.cpp: changes, notifications, calls, taking one or everything. The first byte
+    says whether they are traced."""
     down, up, split, merge = 0, 1, 14, 15
     add, delete, address_add, address_delete = 2, 3, 4, 5
     take_one, take_all = bytes([4]), bytes([5])
@@ -421,7 +422,7 @@ def vex_days():
 
     death = node_status(2, 0, 2) + interface_status(4, 0) + interface_status(5, 0) + node_report(down, 3)
     back = node_status(2, 1) + interface_status(4, 1) + interface_status(5, 1) + node_report(up, 3)
-    return {
+    days = {
         "death-and-return": death + take_all + back + take_all,
         "death-that-waits": death + take_one + call(1) + take_one + back + take_all,
         "stale-and-repeated": node_report(down, 3) + node_report(up, 3) + take_all + death * 2 + take_all,
@@ -446,6 +447,8 @@ def vex_days():
         "results": b"".join(result(monitor, value) for monitor in range(8) for value in (0, 1, 2, -1, -16)) + take_all,
         "others": b"".join(other_report(kind) for kind in (5, 6, 7, 8, 9)) + take_all,
     }
+    return {f"{name}{'-traced' if traced == 0 else ''}": bytes([traced]) + steps
+            for name, steps in days.items() for traced in (0, 1)}
 
 
 CORPORA = {

@@ -1,7 +1,7 @@
 // VEX mode: changes of a cluster, notifications of its monitors and calls of a program, in any order and with any
 // content. At the end the table in force has to be what the cluster services say.
 //
-// An input is a sequence of steps: a byte that says which, then what the step takes.
+// An input is a byte that says whether its steps are traced, and the steps: a byte that says which, then what it takes.
 #include <poll.h>
 #include <sanitizer/lsan_interface.h>
 #include <unistd.h>
@@ -27,6 +27,7 @@
 #include "hb_communication/vex_table_build.h"
 #include "hb_global_data/vex_event_queue.h"
 #include "platform_doubles.h"
+#include "support/event_pool.h"
 #include "support/input.h"
 #include "support/require.h"
 
@@ -125,6 +126,7 @@ class Target {
   void check_outputs(Hb_Rc rc);
   static void check_table();
   void check_end();
+  void restore();
 
   int* descriptors_ = nullptr;
   int count_ = 0;
@@ -145,20 +147,32 @@ Target::Target() {
   REQUIRE(hb_initialize_evmon_event_handlers() == Hb_Success);
   REQUIRE(hb_get_file_descriptor_array(&descriptors_, &count_) == Hb_Success);
   refresh();
+  restore();
   __lsan_enable();
 }
 
 void Target::run(Input input) {
-  fill_script();
-  subscribe_to_everything();
-  refresh();
-  take_everything();
+  const bool is_traced = input.take<uint8_t>() % 8U == 0;
+  platform_double().registrations.front().levels[0] = is_traced ? 1 : 0;
+  platform_double().registrations.front().levels[1] = is_traced ? 1 : 0;
   for (size_t i = 0; i < most_steps && !input.empty(); ++i) {
     step(input);
     check_table();
     platform_double().traces.clear();
   }
   check_end();
+  restore();
+}
+
+// To the cluster that every input starts with. A run ends with as much memory as it began with, so that the fuzzer has
+// no reason to look for leaks behind each.
+void Target::restore() {
+  fill_script();
+  subscribe_to_everything();
+  refresh();
+  take_everything();
+  platform_double().traces.clear();
+  scripted_cluster().asked.clear();
 }
 
 void Target::step(Input& input) {
@@ -503,6 +517,7 @@ void Target::check_end() {
   take_everything();
   check_table();
   REQUIRE(VEX_event_queue_is_empty() == Hb_True);
+  REQUIRE(fuzz::events_in_use() == 0);
   REQUIRE(nodes_of_table() == nodes_of_script());
   REQUIRE(adapters_of_table() == adapters_of_script());
   REQUIRE(platform.assertions.empty());

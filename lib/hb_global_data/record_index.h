@@ -17,12 +17,14 @@ class Record_Index {
     table_ = table;
     removals_ = hash_removals;
     limit_ = std::min(limit, Capacity);
-    std::fill_n(records_.begin(), limit_, nullptr);
+    std::fill_n(records_.begin(), end_, nullptr);
+    end_ = 0;
   }
 
   void add(uint32_t number, Record& record) {
     if (number < limit_) {
       records_[number] = &record;
+      end_ = std::max(end_, number + 1);
     }
   }
 
@@ -41,6 +43,7 @@ class Record_Index {
   const H_table_str* table_ = nullptr;
   uint32_t removals_ = 0;
   uint32_t limit_ = 0;
+  uint32_t end_ = 0;  // behind the highest number that was added
   std::array<Record*, Capacity> records_{};
 };
 
