@@ -84,7 +84,7 @@ class CancelledInside : public TableState, public testing::WithParamInterface<Se
 TEST_P(CancelledInside, LeavesTheMutexFreeAndTheListsUsable) {
   const LeakAllowed tables_stay;  // of new interfaces the table before them stays allocated
   EXPECT_TRUE(run_cancelled(GetParam().run));
-  EXPECT_TRUE(is_mutex_free());
+  ASSERT_TRUE(is_mutex_free());
   EXPECT_EQ(output, nullptr);
   EXPECT_EQ(Scripted_Cluster::outstanding(), 1U);  // the boot list
   zu_vex_IP_address6_t boot = scripted_address(1, 1, 0);

@@ -339,7 +339,7 @@ TEST_F(ConfigurationUpdate, ASecondConfigurationEventLeavesTheTableInForce) {
   EXPECT_EQ(update_with_notification(), Hb_Success);
   EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration", "nodes 1: 3", "configuration"));
   for (int i = 0; i < 4; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
-  EXPECT_EQ(global_config_tbl.Hb_num_nodes, 3);
+  ASSERT_EQ(global_config_tbl.Hb_num_nodes, 3);
   EXPECT_EQ(find_configured_node(3)->state, Hb_Entity_Down);
 }
 
@@ -356,7 +356,7 @@ TEST_F(ConfigurationUpdate, ARefreshWhileAConfigurationEventWaitsDoesNotEmptyThe
   for (int i = 0; i < 2; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
   EXPECT_EQ(out.events, 128);
   EXPECT_STREQ(out.name, "Hb_Config_Group");
-  EXPECT_EQ(global_config_tbl.Hb_num_nodes, 3);
+  ASSERT_EQ(global_config_tbl.Hb_num_nodes, 3);
   EXPECT_NE(find_configured_adapter(144), nullptr);
   adapter_event_handler_p = nullptr;
 }
@@ -369,7 +369,7 @@ TEST_F(ConfigurationUpdate, ARefreshThatFindsTheSameDeathQueuesASecondConfigurat
   hb_refresh_boot_ip_addrs_and_update_events();
   EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration", "nodes 1: 3", "configuration"));
   for (int i = 0; i < 4; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
-  EXPECT_EQ(global_config_tbl.Hb_num_nodes, 3);
+  ASSERT_EQ(global_config_tbl.Hb_num_nodes, 3);
   EXPECT_EQ(find_configured_node(3)->state, Hb_Entity_Down);
   adapter_event_handler_p = nullptr;
 }
@@ -466,47 +466,54 @@ TEST_F(ConfigurationUpdate, WithoutMemoryTellsNothingAndFindsTheSameAgain) {
 }
 
 // The death of node 3 and its configuration event are queued; memory fails when node 2 has died as well.
-TEST_F(ConfigurationUpdate, WithoutMemoryLeavesTheOlderNewTableToItsConfigurationEvent) {
-  trace_nothing();
-  node_goes_down(3);
-  EXPECT_EQ(update_with_notification(), Hb_Success);
+class UpdateWithoutMemory : public ConfigurationUpdate {
+ protected:
+  UpdateWithoutMemory() {
+    trace_nothing();
+    node_goes_down(3);
+    EXPECT_EQ(update_with_notification(), Hb_Success);
+    node_goes_down(2);
+    node_comes(5);
+  }
+
+  // Every allocation from the n-th on fails.
+  Hb_Rc update_failing_from(size_t nth) {
+    const AllocationFailure failure(nth, false);
+    return update_with_notification();
+  }
+};
+
+TEST_F(UpdateWithoutMemory, LeavesTheOlderNewTableToItsConfigurationEvent) {
   const Hb_Node_config_state* waiting = global_config_tbl_new.node_list;
-  node_goes_down(2);
-  node_comes(5);
-  size_t failures = 0;
+  size_t failed_events = 0;
   for (size_t nth = 1;; ++nth) {
+    set_hb_errno(untouched_number);
     const long before = live_allocations();
-    Hb_Rc rc = Hb_Success;
-    {
-      const AllocationFailure failure(nth);
-      rc = update_with_notification();
-    }
-    if (rc == Hb_Success) break;
-    ++failures;
+    if (update_failing_from(nth) == Hb_Success) break;
+    failed_events += hb_get_errno() == HB_ENOMEM ? 1U : 0U;
     EXPECT_EQ(live_allocations(), before) << nth;
     EXPECT_EQ(global_config_tbl_new.node_list, waiting) << nth;
-    EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration")) << nth;
+    EXPECT_EQ(by_node(global_config_tbl_new, 2)->state, Hb_Entity_Up) << nth;
+    EXPECT_EQ(by_node(global_config_tbl_new, 5), nullptr) << nth;
     EXPECT_EQ(global_num_nodes, 3) << nth;
     EXPECT_EQ(global_node_tbl[5], Hb_False) << nth;
+    EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration")) << nth;
   }
-  EXPECT_GE(failures, 12U);  // eight of the table, and four events
+  EXPECT_GE(failed_events, 4U);  // a death, two joins and the configuration event
 }
 
-TEST_F(ConfigurationUpdate, WithoutMemoryPutsNothingInForceThatIsNotTold) {
-  trace_nothing();
-  node_goes_down(3);
-  EXPECT_EQ(update_with_notification(), Hb_Success);
-  node_goes_down(2);
-  {
-    const AllocationFailure failure(1, false);
-    EXPECT_EQ(update_with_notification(), Hb_Failure);
+TEST_F(UpdateWithoutMemory, PutsNothingInForceThatIsNotTold) {
+  size_t nth = 1;
+  for (set_hb_errno(untouched_number); hb_get_errno() != HB_ENOMEM; ++nth) {
+    ASSERT_EQ(update_failing_from(nth), Hb_Failure) << nth;
   }
   for (int i = 0; i < 2; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
   EXPECT_EQ(out.events, 128);
   EXPECT_EQ(find_configured_node(3)->state, Hb_Entity_Down);
   EXPECT_EQ(find_configured_node(2)->state, Hb_Entity_Up);  // its death is still to be told
+  event_sequence = 0;
   EXPECT_EQ(update_with_notification(), Hb_Success);
-  EXPECT_THAT(queued(), ElementsAre("nodes 1: 2", "configuration"));
+  EXPECT_THAT(queued(), ElementsAre("nodes 1: 2", "configuration", "nodes 2: 5", "adapters 2: 240"));
 }
 
 }  // namespace
