@@ -3,6 +3,7 @@
 
 #include "VEX_EVMONHandler.h"
 #include "VEX_HBC_trace.h"
+#include "adapters_by_node.h"
 #include "hb_communication/event_reception.h"
 #include "platform_list.h"
 #include "platform_membership.h"
@@ -88,20 +89,40 @@ void trace_goes_down(const Hb_Adapter& adapter, zu_int32_t node) {
               block_of(adapter.Hb_state), block_of(node)});
 }
 
-// The node's adapters that are up are named in the event and go down; each record of the list counts.
+// An adapter is named in the event and goes down. False when there is no memory for the event.
+bool take_down(Hb_Adapter& adapter, zu_int32_t node, Adapter_Event& event) {
+  trace_goes_down(adapter, node);
+  if (!event.name(adapter.Hb_adapter_num)) {
+    return false;
+  }
+  adapter.Hb_state = Hb_Entity_Down;
+  return true;
+}
+
+// All of the node that are up; each record of the list counts.
 Hb_Rc take_adapters_down(zu_int32_t node, Adapter_Event& event) {
   Hb_Adapter* end = global_config_tbl.Hb_global_adapter_list + adapters_in_list(global_config_tbl);
   for (Hb_Adapter* adapter = global_config_tbl.Hb_global_adapter_list; adapter != end; ++adapter) {
-    if (adapter->Hb_state != Hb_Entity_Up || !is_adapter_of(global_config_tbl, *adapter, static_cast<uint32_t>(node))) {
-      continue;
-    }
-    trace_goes_down(*adapter, node);
-    if (!event.name(adapter->Hb_adapter_num)) {
+    if (adapter->Hb_state == Hb_Entity_Up && is_adapter_of(global_config_tbl, *adapter, static_cast<uint32_t>(node)) &&
+        !take_down(*adapter, node, event)) {
       return fail(HB_ENOMEM);
     }
-    adapter->Hb_state = Hb_Entity_Down;
   }
   return Hb_Success;
+}
+
+Hb_Rc take_adapters_down(zu_int32_t node, Adapter_Event& event, const Adapters_By_Node& adapters) {
+  const bool whole = adapters.for_each(static_cast<uint32_t>(node), [&](Hb_Adapter& adapter) {
+    return adapter.Hb_state != Hb_Entity_Up || take_down(adapter, node, event);
+  });
+  return whole ? Hb_Success : fail(HB_ENOMEM);
+}
+
+void finish(Hb_VEX_Event* event, zu_int32_t kind, zu_int32_t count) {
+  if (event != nullptr) {
+    event->group.Hb_membership_grp_union.Hb_adapter_membership_grp.Hb_num_adapters = count;
+  }
+  trace_values(Trace_Info, trace_adapters_on_node, kind, count);
 }
 
 // The node's interfaces that are up are named in the event, as far as the configuration knows them. One may be listed
@@ -183,10 +204,16 @@ Hb_Rc EVMONHandler::constructAdapterEventOnNode(zu_int32_t _node, Hb_VEX_Event**
   } else if (_evtType == HB_EVENT_JOIN) {
     rc = construct_adapter_join(_node, event);
   }
-  if (_evt != nullptr && *_evt != nullptr) {
-    (*_evt)->group.Hb_membership_grp_union.Hb_adapter_membership_grp.Hb_num_adapters = event.count();
-  }
-  trace_values(Trace_Info, trace_adapters_on_node, _evtType, event.count());
+  finish(_evt != nullptr ? *_evt : nullptr, _evtType, event.count());
+  return rc;
+}
+
+Hb_Rc construct_adapter_death_on_node(EVMONHandler& handler, zu_int32_t node, Hb_VEX_Event** event,
+                                      const Adapters_By_Node& adapters) {
+  *event = nullptr;
+  Adapter_Event built(handler, event, HB_EVENT_DEATH);
+  const Hb_Rc rc = take_adapters_down(node, built, adapters);
+  finish(*event, HB_EVENT_DEATH, built.count());
   return rc;
 }
 

@@ -4,6 +4,7 @@
 #include <memory>
 
 #include "VEX_EVMONNodeLivenessHandler.h"
+#include "adapters_by_node.h"
 #include "vex_outputs.h"
 #include "vex_platform_records.h"
 #include "vex_waiting_table.h"
@@ -105,11 +106,12 @@ bool mark_nodes_down(EVMONHandler& handler, const Report& report, Hb_VEX_Event*&
 
 // An event for each node that had an adapter up; fails when memory did not do for one of them.
 Hb_Rc queue_adapter_deaths(EVMONHandler& handler, const Report& report) {
+  const Adapters_By_Node by_node;
   Hb_Rc rc = Hb_Success;
   for (uint32_t index = 0; index < report.num_remote_node_up; ++index) {
     Hb_VEX_Event* adapters = nullptr;
     const auto node = static_cast<zu_int32_t>(report.remote_node_numbers[index]);
-    if (handler.constructAdapterEventOnNode(node, &adapters, HB_EVENT_DEATH) != Hb_Success) {
+    if (construct_adapter_death_on_node(handler, node, &adapters, by_node) != Hb_Success) {
       rc = Hb_Failure;
     }
     if (adapters != nullptr) {

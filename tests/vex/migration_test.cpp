@@ -4,6 +4,21 @@
 #include "migrating_client.h"
 #include "support/allocation_faults.h"
 
+namespace {
+
+int times_dropped = 0;
+Hb_Boolean mode_when_dropped = Hb_False;
+
+}  // namespace
+
+extern "C" Hb_Rc __real__Z16hb_remove_socketv();
+extern "C" Hb_Rc __wrap__Z16hb_remove_socketv();
+Hb_Rc __wrap__Z16hb_remove_socketv() {
+  ++times_dropped;
+  mode_when_dropped = IsVEX;
+  return __real__Z16hb_remove_socketv();
+}
+
 namespace hb_test {
 namespace {
 
@@ -238,6 +253,14 @@ TEST_F(Migration, ACommitDoesItsStepsInTheirOrder) {
     }
   }
   EXPECT_THAT(steps, ElementsAre(109, 111, 110, 272, 282, 283, 233, 285));
+}
+
+TEST_F(Migration, ACommitIsInVexModeWhenItDropsTheConnection) {
+  prepare();
+  times_dropped = 0;
+  commit();
+  EXPECT_EQ(1, times_dropped);
+  EXPECT_EQ(Hb_True, mode_when_dropped);
 }
 
 TEST_F(Migration, ACommitQueuesWhatTheMoveChangesAndWakesTheCaller) {

@@ -140,6 +140,40 @@ TEST_F(SplitMerge, TheCountOfTheDeathIsThatOfTheOtherPartWhoeverWasUp) {
   EXPECT_THAT(numbers_of(265), ElementsAre(99));
 }
 
+TEST_F(SplitMerge, WithoutMemoryForAnIndexOfTheAdaptersTheDeathsAreTheSame) {
+  Monitored_Client::trace_nothing();
+  for (const size_t nth : {2U, 3U}) {
+    {
+      const AllocationFailure failure(nth);
+      EXPECT_EQ(Hb_Success, split());
+      EXPECT_TRUE(failure.happened());
+    }
+    EXPECT_THAT(Monitored_Client::queue(),
+                ElementsAre(Queued_Event{1, {3, 4}, 2}, Queued_Event{1, {adapter(4, 0), adapter(4, 1)}, 2},
+                            Queued_Event{1, {adapter(3, 0), adapter(3, 1)}, 2}));
+    hb_free_split_info(&info_of());
+    Monitored_Client::drop_queue();
+    for (const uint32_t node : {3U, 4U}) Monitored_Client::mark(node, Hb_Entity_Up, Hb_Entity_State_Reason_Up);
+  }
+  has_lists = false;
+}
+
+TEST_F(SplitMerge, RecordsTheAdaptersOfEachNodeInTheirOrder) {
+  remote = {2, 4, 3};
+  Monitored_Client::mark_adapters(4, Hb_Entity_Down);
+  split();
+  std::vector<uint32_t> adapters;
+  for (const Recorded_Trace& goes_down : platform_double().traces_of(79)) {
+    adapters.push_back(goes_down.block_value(1));
+  }
+  EXPECT_THAT(adapters, ElementsAre(adapter(2, 0), adapter(2, 1), adapter(3, 0), adapter(3, 1)));
+  const std::vector<Recorded_Trace> counts = platform_double().traces_of(84);
+  ASSERT_EQ(3U, counts.size());
+  EXPECT_THAT(counts[0].values, ElementsAre(1U, 2U));
+  EXPECT_THAT(counts[1].values, ElementsAre(1U, 0U));
+  EXPECT_THAT(counts[2].values, ElementsAre(1U, 2U));
+}
+
 TEST_F(SplitMerge, ANodeWithoutAdaptersUpHasNoAdapterEvent) {
   Monitored_Client::mark_adapters(4, Hb_Entity_Down);
   split();
@@ -401,7 +435,7 @@ TEST_F(SplitMerge, WithoutMemoryForTheDeathFailsAndMarksNobody) {
 TEST_F(SplitMerge, WithoutMemoryForTheAdaptersOfANodeFailsAndTellsTheOthers) {
   Monitored_Client::trace_nothing();
   {
-    const AllocationFailure failure(2);
+    const AllocationFailure failure(4);  // behind the nodes and the two arrays of the index
     EXPECT_EQ(Hb_Failure, split());
     EXPECT_TRUE(failure.happened());
   }
