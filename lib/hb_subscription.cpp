@@ -209,7 +209,7 @@ Hb_Subscription_Type type_to_send(Hb_Subscription_Type type, int32_t members) {
   return type;
 }
 
-Hb_Rc wake_new_group_monitor(char request) {
+Hb_Rc wake_new_group_monitor(const char& request) {
   if (new_group_event_handler_p == nullptr) {
     trace(Trace_Info, trace_no_new_group_handler);
     return fail(HB_ENOGROUPHANDLER);

@@ -30,5 +30,6 @@ class Pipe {
   bool is_open_;
 };
 
-// As write() of one byte. Where nobody can read it fails with EPIPE and raises no signal.
-ssize_t write_to_pipe(int descriptor, char byte);
+// As write() of one byte. Where nobody can read it fails with EPIPE and raises no signal. The byte outlives a thread
+// that is cancelled while it waits for room.
+ssize_t write_to_pipe(int descriptor, const char& byte);
