@@ -36,6 +36,12 @@ Daemon::Daemon(Loop& loop, const std::string& path, MembershipSource& source, st
         rotate_keys();
         schedule_rotation();
       }) {
+  handler_.on_delayed_shutdown([this, &loop] {
+    server_.when_alone([&loop] {
+      spdlog::info("the last client has left");
+      loop.stop();
+    });
+  });
   claim_.publisher().publish(keys_.published());
   schedule_rotation();
   server_.set_stale_age(settings.stale_age);

@@ -99,6 +99,7 @@ const RequestHandler::Effect RequestHandler::effects[] = {
     {HB_GET_ADAPTER_STATE, &RequestHandler::send_state},
     {HB_ENABLE_MANUAL_CONTROL_NIMS, &RequestHandler::switch_manual_control},
     {HB_DISABLE_MANUAL_CONTROL_NIMS, &RequestHandler::switch_manual_control},
+    {HB_DELAYED_DAEMON_SHUTDOWN, &RequestHandler::shut_down_later},
 };
 
 RequestHandler::RequestHandler(Loop& loop, const Cluster& cluster, ChangeSink& sink, InterfaceControl* interfaces,
@@ -237,6 +238,12 @@ void RequestHandler::switch_manual_control(Client& client, const PlainRequest& r
     spdlog::info("{}: the monitor of {} is under {} control", client.label(), interface, on ? "manual" : "its own");
     changes_.apply(ManualControl{interface, on});
   }
+}
+
+/* Clients that move to another source of events leave one by one; the daemon stays for those that have not yet. */
+void RequestHandler::shut_down_later(Client& client, const PlainRequest& /*request*/) {
+  spdlog::info("{}: asks for a shutdown when the last client has left", client.label());
+  delayed_shutdown_();
 }
 
 std::size_t RequestHandler::configuration_size() { return configuration()->size(); }

@@ -2,6 +2,9 @@
 #ifndef HBD_REQUEST_HANDLER_H
 #define HBD_REQUEST_HANDLER_H
 
+#include <functional>
+#include <utility>
+
 #include "adapter_control.h"
 #include "client.h"
 #include "cluster.h"
@@ -24,6 +27,9 @@ class RequestHandler {
    */
   RequestHandler(Loop& loop, const Cluster& cluster, ChangeSink& sink, InterfaceControl* interfaces, RouteTable& routes,
                  const ControlSettings& settings);
+
+  /** Called when a client asks for a shutdown as soon as nobody is connected any more. */
+  void on_delayed_shutdown(std::function<void()> callback) { delayed_shutdown_ = std::move(callback); }
 
   /** Serves one well-formed request. */
   void handle(Client& client, const Request& request);
@@ -54,6 +60,7 @@ class RequestHandler {
   void route_message(Client& client, const PlainRequest& request);
   void take_heartbeat(Client& client, const PlainRequest& request);
   void switch_manual_control(Client& client, const PlainRequest& request);
+  void shut_down_later(Client& client, const PlainRequest& request);
   const SharedFrame& configuration();
 
   const Cluster& cluster_;
@@ -66,6 +73,7 @@ class RequestHandler {
   Reports reports_;
   ScriptedAnswers answers_;
   HeartbeatAnswer heartbeat_;
+  std::function<void()> delayed_shutdown_ = [] {};
   SharedFrame configuration_;
   Hb_Seq_Num configuration_stands_for_ = 0; /* number of the last event that the frame knows of */
   std::uint64_t routed_messages_ = 0;

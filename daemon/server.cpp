@@ -130,6 +130,9 @@ void Server::forget_disconnected() {
   if (std::exchange(some_left_, false)) {
     std::erase_if(clients_, [](const auto& client) { return !client->connected(); });
   }
+  if (clients_.empty() && when_alone_) {
+    std::exchange(when_alone_, nullptr)();
+  }
 }
 
 void Server::on_request(Client& client, const Request& request) {

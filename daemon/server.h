@@ -34,6 +34,9 @@ class Server : public Audience, public ClientOwner {
   /** Sets the age from which events are dropped for clients that have asked for it. */
   void set_stale_age(std::chrono::milliseconds age) { stale_age_ = age; }
 
+  /** Calls once, as soon as the last client has left. */
+  void when_alone(std::function<void()> callback) { when_alone_ = std::move(callback); }
+
   [[nodiscard]] std::size_t clients() const;
   [[nodiscard]] std::size_t subscriptions() const override;
   [[nodiscard]] bool has_read() const override;
@@ -54,6 +57,7 @@ class Server : public Audience, public ClientOwner {
   int listening_;
   RequestCallback on_request_;
   std::function<void()> changed_ = [] {};
+  std::function<void()> when_alone_;
   std::size_t queue_bound_ = 0;
   std::chrono::milliseconds stale_age_{10000};
   Descriptor spare_; /* given up for a moment to turn a client away when descriptors run out */

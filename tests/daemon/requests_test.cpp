@@ -1,8 +1,10 @@
 /* What the daemon does with each request, and with what is none. */
 #include <gmock/gmock.h>
 #include <sys/socket.h>
+#include <unistd.h>
 
 #include <cstring>
+#include <memory>
 
 #include "scripted_daemon.h"
 
@@ -39,6 +41,26 @@ INSTANTIATE_TEST_SUITE_P(EachOfThem, UnansweredRequest,
                                          Accepted{222, 4}, Accepted{224, 0}, Accepted{225, 3}, Accepted{226, 0},
                                          Accepted{227, 0}),
                          [](const auto& each) { return std::to_string(each.param.request); });
+
+TEST(DelayedShutdown, comes_when_the_last_client_has_left) {
+  ScriptedDaemon daemon;
+  auto leaving = std::make_unique<Connection>(daemon.socket());
+  auto staying = std::make_unique<Connection>(daemon.socket());
+  ASSERT_TRUE(staying->configuration());
+  leaving->send(request(227, {}));
+  ASSERT_TRUE(leaving->configuration());
+  leaving.reset();
+  ASSERT_TRUE(staying->configuration());
+  {
+    Connection late(daemon.socket());
+    ASSERT_TRUE(late.configuration());
+  }
+  ASSERT_TRUE(staying->configuration());
+  staying.reset();
+  EXPECT_EQ(daemon.process().wait_for_end(), 0);
+  EXPECT_THAT(daemon.process().log(), testing::HasSubstr("asks for a shutdown when the last client has left"));
+  EXPECT_NE(access(daemon.socket().c_str(), F_OK), 0);
+}
 
 TEST(Request, that_arrives_byte_by_byte_is_served) {
   ScriptedDaemon daemon;
