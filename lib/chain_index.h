@@ -16,7 +16,7 @@ class Chain_Index {
 
   explicit Chain_Index(uint32_t records) : records_(records), mask_(std::bit_ceil(records | 1U) - 1) {
     heads_.reset(new (std::nothrow) uint32_t[size_t{mask_} + 1]);
-    next_.reset(new (std::nothrow) uint32_t[records]);
+    next_.reset(new (std::nothrow) uint32_t[size_t{records} + 1]);
     if (heads_ == nullptr || next_ == nullptr) {
       heads_ = nullptr;
     } else {
