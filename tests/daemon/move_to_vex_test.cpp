@@ -1,6 +1,7 @@
 // A client of a live daemon that moves to the cluster services while it runs, or tries to.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <poll.h>
 
 #include <csignal>
 #include <cstdlib>
@@ -134,6 +135,28 @@ TEST_F(MoveToVex, WhatIsDifferentIsToldByEvents) {
   }
   EXPECT_THAT(kinds, testing::ElementsAre(HB_EVENT_DEATH, HB_EVENT_DEATH, HB_EVENT_CONFIGURATION, HB_EVENT_JOIN,
                                           HB_EVENT_JOIN));
+}
+
+// The answers to the subscriptions are in the socket, and go with it.
+TEST_F(MoveToVex, WhatTheDaemonSaidAndNobodyReadIsLostAndANewSubscriptionTellsIt) {
+  ASSERT_EQ(Hb_Success, caller.subscribe());
+  caller.read_configuration();
+  int* descriptors = nullptr;
+  int count = 0;
+  ASSERT_EQ(Hb_Success, hb_get_file_descriptor_array(&descriptors, &count));
+  ASSERT_EQ(1, count);
+  pollfd socket = {descriptors[0], POLLIN, 0};
+  EXPECT_EQ(1, poll(&socket, 1, -1));
+  hb_free_file_descriptor_array(descriptors);
+  life.emplace(4);
+  move();
+  for (const Taken_Event& event : caller.taken) {
+    EXPECT_EQ(Hb_Success, event.result) << event.error;
+    EXPECT_NE(HB_EVENT_NEW_GROUP, event.events);
+  }
+  ASSERT_EQ(Hb_Success, caller.subscribe());
+  caller.take_all();
+  expect_true_picture();
 }
 
 TEST_F(MoveToVex, ThePreparationLeavesTheDaemonInUse) {
