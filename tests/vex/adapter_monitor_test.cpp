@@ -39,8 +39,9 @@ class AdapterMonitor : public MonitorTest<EVMONAdapterEventHandler> {
     }
   }
 
-  // Node 1024 has en7 twice: under the last number that an event has a place for, and under the next.
-  static void fill_table_of_wide_nodes() {
+  // A table of nodes with 96 adapters each, of which one has en7 twice.
+  static void fill_table_of_wide_nodes(Hb_Adapter_Number first) {
+    empty_global_config_table(&global_config_tbl);
     Hb_Configuration_Internal& table = global_config_tbl;
     table.Hb_max_nodes = 2049;
     table.Hb_adapters_per_node = 96;
@@ -49,7 +50,7 @@ class AdapterMonitor : public MonitorTest<EVMONAdapterEventHandler> {
     table.adap_hash = Hash_init("adapters", 7);
     for (uint32_t index = 0; index < 2; ++index) {
       Hb_Adapter& wide = table.Hb_global_adapter_list[index];
-      wide.Hb_adapter_num = 98351 + index;
+      wide.Hb_adapter_num = first + index;
       wide.Hb_state = Hb_Entity_Up;
       std::strcpy(wide.Hb_adapter_type, "en7");
       Hash_insert(wide.Hb_adapter_num, table.adap_hash, &wide);
@@ -376,10 +377,15 @@ TEST_F(AdapterMonitor, WithoutAGroupTellsTheEventAlone) {
   EXPECT_EQ(Hb_Failure, monitor.handler(&out.events, out.name, nullptr, &out.sequence));
 }
 
+TEST_F(AdapterMonitor, OfANodeWithManyAdaptersEachIsLookedAt) {
+  fill_table_of_wide_nodes(3 * 96 + 94);
+  EXPECT_EQ(Hb_Success, take(notification(ZU_EVM_EVENT_DOWN, 3, en7)));
+  expect_told(1, {382, 383});
+}
+
 TEST_F(AdapterMonitor, AnAdapterBeyondTheListIsNotCounted) {
-  // 2049 nodes of 96 adapters have more numbers than an event has places.
-  empty_global_config_table(&global_config_tbl);
-  fill_table_of_wide_nodes();
+  // 2049 nodes of 96 adapters have more numbers than an event has places: the last one, and the next.
+  fill_table_of_wide_nodes(98351);
   EXPECT_EQ(Hb_Success, take(notification(ZU_EVM_EVENT_DOWN, 1024, en7)));
   EXPECT_EQ(1, out.events);
   EXPECT_EQ(1, count_of(*out.group));
