@@ -1,9 +1,9 @@
 #include "VEX_EVMONAdapterEventHandler.h"
 
-#include <algorithm>
 #include <cerrno>
 
 #include "VEX_interface_changes.h"
+#include "adapter_list.h"
 #include "vex_present_interfaces.h"
 
 namespace {
@@ -14,10 +14,7 @@ Hb_Adapter_Membership_Grp& members_of(Hb_Group& group) {
   return group.Hb_membership_grp_union.Hb_adapter_membership_grp;
 }
 
-void clear_members(Hb_Group& group) {
-  const auto entries = std::min<Hb_Adapter_Number>(adapter_number_limit(global_config_tbl), HB_MAX_ADAPTERS);
-  std::fill_n(members_of(group).Hb_adapter_list, entries, HB_NOT_IN_GROUP);
-}
+void clear_members(Hb_Group& group) { clear_adapter_list(members_of(group), adapter_number_limit(global_config_tbl)); }
 
 zu_evm_event_metadata_t metadata_of(Notification& notification) {
   zu_evm_event_metadata_t metadata = {};

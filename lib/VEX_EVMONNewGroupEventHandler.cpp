@@ -2,10 +2,10 @@
 
 #include <unistd.h>
 
-#include <algorithm>
 #include <cerrno>
 
 #include "VEX_HBC_trace.h"
+#include "adapter_list.h"
 #include "platform_list.h"
 #include "platform_membership.h"
 #include "vex_outputs.h"
@@ -68,11 +68,10 @@ Hb_Rc answer_with_nodes(EVMONHandler& handler, const Vex_Outputs& out) {
   return Hb_Success;
 }
 
-void clear_adapter_list(Hb_Group* group) {
+void clear_members(Hb_Group* group) {
   if (group != nullptr) {
-    const Hb_Adapter_Number entries =
-        std::min<Hb_Adapter_Number>(adapter_number_limit(global_config_tbl), HB_MAX_ADAPTERS);
-    std::fill_n(group->Hb_membership_grp_union.Hb_adapter_membership_grp.Hb_adapter_list, entries, HB_NOT_IN_GROUP);
+    clear_adapter_list(group->Hb_membership_grp_union.Hb_adapter_membership_grp,
+                       adapter_number_limit(global_config_tbl));
   }
 }
 
@@ -80,7 +79,7 @@ Hb_Rc answer_with_adapters(EVMONHandler& handler, const Vex_Outputs& out) {
   if (networkEventSubscriptionName[0] == '\0') {
     return deliver_nothing(out, trace_new_adapter_group_unsubscribed);
   }
-  clear_adapter_list(out.group);
+  clear_members(out.group);
   zu_vex_net_intf_info_t* list = nullptr;
   const int result = zu_vex_get_net_intf_info(&list);
   if (result != 0) {

@@ -1,6 +1,6 @@
 // The records of VEX-mode events, 384 KiB each, from a pool: mapped and unmapped one by one they would take most of a
-// run. A record that is not in use is poisoned, and the one that was released last is used again last, so that reads and
-// writes behind its end or after its release are still found. --wrap puts these in front of the allocator's own.
+// run. A record that is not in use is poisoned, and the one that was released last is used again last, so that reads
+// and writes behind its end or after its release are still found. --wrap puts these in front of the allocator's own.
 #include "support/event_pool.h"
 
 #include <sanitizer/asan_interface.h>

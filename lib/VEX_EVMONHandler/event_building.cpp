@@ -1,8 +1,8 @@
-#include <algorithm>
 #include <cerrno>
 
 #include "VEX_EVMONHandler.h"
 #include "VEX_HBC_trace.h"
+#include "adapter_list.h"
 #include "adapters_by_node.h"
 #include "hb_communication/event_reception.h"
 #include "platform_list.h"
@@ -37,7 +37,7 @@ Hb_VEX_Event* new_adapter_event() {
   Hb_VEX_Event* event = VEX_new_event(Hb_Adapter_Group);
   if (event != nullptr) {
     Hb_Adapter_Membership_Grp& membership = event->group.Hb_membership_grp_union.Hb_adapter_membership_grp;
-    std::fill(std::begin(membership.Hb_adapter_list), std::end(membership.Hb_adapter_list), HB_NOT_IN_GROUP);
+    clear_adapter_list(membership, HB_MAX_ADAPTERS);
     membership.Hb_num_adapters = 0;
     fill_stable_adapter_group(event->group);
   }
