@@ -40,7 +40,7 @@ struct Transition_Count {
 
 // In the table in force; those that change are named in the group, if there is one.
 Transition_Count change_adapters(const Notification& notification, const Transition& transition,
-                                 const Present_Interfaces& present, Hb_Group* group) {
+                                 Present_Interfaces& present, Hb_Group* group) {
   Transition_Count count;
   for_each_adapter_on(global_config_tbl, notification.node_number, notification.p_interface_name,
                       [&](Hb_Adapter& adapter) {
@@ -59,11 +59,10 @@ Transition_Count change_adapters(const Notification& notification, const Transit
   return count;
 }
 
-void change_waiting_table(const Notification& notification, const Transition& transition,
-                          const Present_Interfaces& present) {
+void change_waiting_table(const Notification& notification, const Transition& transition, Present_Interfaces& present) {
   for_each_adapter_on(global_config_tbl_new, notification.node_number, notification.p_interface_name,
                       [&](Hb_Adapter& adapter) {
-                        if (!present.contradict(adapter, transition.state)) {
+                        if (adapter.Hb_state != transition.state && !present.contradict(adapter, transition.state)) {
                           adapter.Hb_state = transition.state;
                         }
                       });
@@ -113,7 +112,7 @@ Hb_Rc Interface_Change::came_or_went() {
 
 Hb_Rc Interface_Change::changed_state(const Transition& transition) {
   trace(Trace_Info, trace_adapter_compared_with_table);
-  const Present_Interfaces present(notification_.node_number, metadata_of(notification_));
+  Present_Interfaces present(notification_.node_number, metadata_of(notification_));
   const Transition_Count count = change_adapters(notification_, transition, present, out_.group);
   change_waiting_table(notification_, transition, present);
   if (count.changed_cnt != 0) {

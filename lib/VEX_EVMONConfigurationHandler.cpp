@@ -1,27 +1,28 @@
 #include "VEX_EVMONConfigurationHandler.h"
 
-#include <memory>
-
 #include "VEX_HBC_trace.h"
 #include "VEX_migration.h"
 #include "hb_communication/vex_set_aside_table.h"
 #include "hb_communication/vex_table_build.h"
+#include "owned_event.h"
 #include "table_comparison.h"
 #include "vex_outputs.h"
 
 namespace {
 
-using Event = std::unique_ptr<Hb_VEX_Event>;
-
 // What the new table changes; of each kind one event or none.
 struct Changes {
-  Event adapter_death;
-  Event node_death;
-  Event config;
-  Event adapter_join;
-  Event node_join;
+  Owned_Event adapter_death;
+  Owned_Event node_death;
+  Owned_Event config;
+  Owned_Event adapter_join;
+  Owned_Event node_join;
+  // Behind an older table that waits: who is up again since.
+  Owned_Event node_return;
+  Owned_Event adapter_return;
 
   bool has_deaths() const { return adapter_death != nullptr || node_death != nullptr; }
+  bool has_joins() const { return adapter_join != nullptr || node_join != nullptr; }
 };
 
 Hb_Rc find_changes(EVMONHandler& handler, Changes& changes) {
@@ -40,26 +41,41 @@ Hb_Rc find_changes(EVMONHandler& handler, Changes& changes) {
   return rc;
 }
 
-// All or nothing: a difference that is not told would be forgotten with the next table.
-Hb_Rc prepare(EVMONHandler& handler, Changes& changes) {
-  if (find_changes(handler, changes) != Hb_Success) {
-    return fail(HB_ENOMEM);
+// What the queue says of an older table that waits is told by now. Who is down or gone in it, and up again, is up in
+// the table in force as well, so that only the older one shows the return.
+Hb_Rc find_returns(EVMONHandler& handler, const Hb_Configuration_Internal& older, Changes& changes) {
+  Hb_VEX_Event* nodes = nullptr;
+  Hb_VEX_Event* adapters = nullptr;
+  Hb_Rc rc = tell_lost_nodes(handler, global_config_tbl_new, older, HB_EVENT_JOIN, &nodes);
+  if (rc == Hb_Success) {
+    rc = tell_lost_adapters(handler, global_config_tbl_new, older, HB_EVENT_JOIN, &adapters);
   }
-  if (!migrate_to_vex_prep && changes.has_deaths()) {
-    changes.config.reset(VEX_new_configuration_event());
-    return changes.config != nullptr ? Hb_Success : fail(HB_ENOMEM);
-  }
-  return Hb_Success;
+  changes.node_return.reset(nodes);
+  changes.adapter_return.reset(adapters);
+  return rc;
 }
 
-void append(Event event) {
-  if (event != nullptr) {
-    VEX_add_event_at_end(event.release());
+// Whether a configuration event has to bring the new table into force, where the comparison made none.
+bool needs_configuration_event(const Changes& changes, bool waits) {
+  return migrate_to_vex_prep ? changes.config == nullptr && (changes.has_deaths() || changes.has_joins())
+                             : changes.has_deaths() || waits;
+}
+
+// All or nothing: a difference that is not told would be forgotten with the next table.
+Hb_Rc prepare(EVMONHandler& handler, const Hb_Configuration_Internal* older, Changes& changes) {
+  bool whole = find_changes(handler, changes) == Hb_Success;
+  if (older != nullptr) {
+    whole = whole && find_returns(handler, *older, changes) == Hb_Success;
   }
+  if (whole && needs_configuration_event(changes, older != nullptr)) {
+    changes.config.reset(VEX_new_configuration_event());
+    whole = changes.config != nullptr;
+  }
+  return whole ? Hb_Success : fail(HB_ENOMEM);
 }
 
 // The death is delivered at once to who has read a notification, and to all others by the queue.
-void deliver_adapter_death(EVMONHandler& handler, Event& death, const Vex_Outputs& out, bool at_once) {
+void deliver_adapter_death(EVMONHandler& handler, Owned_Event& death, const Vex_Outputs& out, bool at_once) {
   trace(Trace_Info, trace_update_adapter_deaths);
   *out.events = death->group.Hb_events;
   if (!put_subscription_name(out.events, out.name, networkEventSubscriptionName)) {
@@ -69,7 +85,7 @@ void deliver_adapter_death(EVMONHandler& handler, Event& death, const Vex_Output
   if (at_once) {
     handler.copy_adapter_Hb_Group(&death->group, out.group);
   } else {
-    append(std::move(death));
+    append_event(std::move(death));
   }
 }
 
@@ -81,17 +97,17 @@ void deliver_configuration(const Vex_Outputs& out) {
 void deliver_first(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool at_once) {
   if (changes.adapter_death != nullptr) {
     deliver_adapter_death(handler, changes.adapter_death, out, at_once);
-  } else if (changes.node_death != nullptr) {
+  } else if (changes.config != nullptr) {
     deliver_no_event(out, 0);
   } else {
     deliver_configuration(out);
   }
 }
 
-void append_node_death(Event death) {
+void append_node_death(Owned_Event death) {
   if (death != nullptr) {
     trace(Trace_Info, trace_update_node_deaths);
-    append(std::move(death));
+    append_event(std::move(death));
   }
 }
 
@@ -101,11 +117,12 @@ void put_new_table_in_force() {
   hb_vex_dump_global_table(&global_config_tbl, "Update global table: current table after copy");
 }
 
-// Deaths come first. With deaths the old table stays until the configuration event behind them is taken.
+// Deaths come first. With deaths the old table stays until the configuration event behind them is taken, and so it does
+// behind an older table whose deaths are still in the queue: they name the old table's numbers.
 void tell(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool at_once) {
-  const bool takes_effect = !migrate_to_vex_prep && !changes.has_deaths();
+  const bool takes_effect = !migrate_to_vex_prep && changes.config == nullptr;
   if (migrate_to_vex_prep) {
-    append(std::move(changes.adapter_death));
+    append_event(std::move(changes.adapter_death));
     if (at_once) {
       deliver_no_event(out, 0);
     }
@@ -113,9 +130,11 @@ void tell(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool 
     deliver_first(handler, changes, out, at_once);
   }
   append_node_death(std::move(changes.node_death));
-  append(std::move(changes.config));
-  append(std::move(changes.node_join));
-  append(std::move(changes.adapter_join));
+  append_event(std::move(changes.config));
+  append_event(std::move(changes.node_join));
+  append_event(std::move(changes.adapter_join));
+  append_event(std::move(changes.node_return));
+  append_event(std::move(changes.adapter_return));
   if (takes_effect) {
     put_new_table_in_force();
   }
@@ -132,7 +151,7 @@ Hb_Rc update(EVMONHandler& handler, const Vex_Outputs& out, zu_evm_event_metadat
   hb_vex_dump_global_table(&global_config_tbl_new, "Update global table: new table");
   {
     Changes changes;
-    rc = prepare(handler, changes);
+    rc = prepare(handler, older.waiting(), changes);
     if (rc != Hb_Success) {
       return rc;
     }

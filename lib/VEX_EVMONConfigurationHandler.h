@@ -2,8 +2,11 @@
 //
 // What the interface leaves open:
 // - While a client prepares to move, or after it gave that up, everything is queued; a notification that is read then
-//   delivers the empty event.
+//   delivers the empty event. A death or a join is followed by a configuration event then, too, also where nothing of
+//   the configuration differs, as the states are told and have to be in force.
 // - When only nodes died, no death is delivered at once, and the caller gets the empty event.
+// - When an older new table still waits for its configuration event, this one waits in its place, and who is up again
+//   since is told as well: the death is in the queue, and the table in force does not know of it.
 // - Without memory for one of the events nothing is told, the table in force stays, and so does an older new table that
 //   waits for its configuration event: the next notification finds the same differences again.
 #pragma once

@@ -9,12 +9,14 @@
 // - So is the death of an adapter of the node itself that its return finds up in the table in force alone.
 // - When only a new table is to be told, it takes effect at once. With deaths of others it cannot, as they are named by
 //   the numbers of the table in force: it waits behind them, and the empty event is delivered.
-// - An adapter of a node that was told dead does not come back with the new table, whatever the cluster services say.
+// - An adapter of the node that is told dead does not come back with the table that was rebuilt for it, whatever the
+//   cluster services say.
 // - A report that is stale, repeated or that cannot be told leaves no table behind; one that waited before it goes on
 //   waiting.
 // - Without memory for one of the events nothing of the report is told, and it fails with HB_ENOMEM. The table in force
 //   stays as it was, so that the next one that is built has the same changes.
-// - A return whose adapters the cluster services do not tell of is told alone.
+// - A return for which the cluster services do not tell the adapters again is told with those that the rebuilt table
+//   has up.
 // - A record that is no record (a null one) is as a read that failed.
 //
 // For a split or a merge:

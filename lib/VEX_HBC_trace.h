@@ -67,21 +67,21 @@ struct Trace_Block {
 };
 
 // The trace library takes a pointer and a length for each block.
-template <size_t Part>
-auto part_of(const Trace_Block* blocks) {
-  if constexpr (Part % 2 == 0) {
-    return blocks[Part / 2].bytes;
+template <size_t Field>
+auto field_of(const Trace_Block* blocks) {
+  if constexpr (Field % 2 == 0) {
+    return blocks[Field / 2].bytes;
   } else {
-    return blocks[Part / 2].length;
+    return blocks[Field / 2].length;
   }
 }
 
-template <size_t... Parts>
+template <size_t... Fields>
 void record_blocks(Trace_Category category, Trace_Record record, const Trace_Block* blocks,
-                   std::index_sequence<Parts...>) {
+                   std::index_sequence<Fields...>) {
   const Errno_Kept kept;
-  tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], static_cast<uint32_t>(sizeof...(Parts) / 2),
-                      part_of<Parts>(blocks)...);
+  tr_ms_record_data_1(hbc_trace_component, record, pTokens[category], static_cast<uint32_t>(sizeof...(Fields) / 2),
+                      field_of<Fields>(blocks)...);
 }
 
 // A record of any number of blocks, as in trace_data(category, record, {{a, 4}, {b, 8}}).

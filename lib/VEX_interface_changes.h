@@ -16,7 +16,7 @@ bool is_adapter_on(const Hb_Adapter& adapter, const char* name);
 // when the interfaces cannot be listed.
 Hb_Rc rebuild_and_tell(EVMONConfigurationHandler& handler, zu_evm_event_metadata_t metadata, const Vex_Outputs& out);
 
-// An alias is in no table: that it came or went is all there is to tell.
+// Of an alias it is told that it came or went, and no more; the next table has it.
 inline Hb_Rc deliver_alias(const Vex_Outputs& out) {
   *out.events = HB_EVENT_ALIAS;
   return Hb_Success;

@@ -1,11 +1,10 @@
 #include "VEX_migration.h"
 
-#include <algorithm>
-
 #include "VEX_HBC_trace.h"
 #include "hb_client/migration.h"
 #include "hb_communication/connection.h"
 #include "hb_communication/vex_table_build.h"
+#include "hb_global_data/node_marks.h"
 #include "hb_global_data/vex_handler_set.h"
 #include "hb_global_data/vex_migration_events.h"
 
@@ -13,25 +12,12 @@ bool migrate_to_vex_prep = false;
 
 namespace {
 
-// A build starts the node table anew; a trial must not do that to the table in force.
-class Node_Table_Kept {
- public:
-  Node_Table_Kept() { std::copy(std::begin(global_node_tbl), std::end(global_node_tbl), nodes_); }
-  Node_Table_Kept(const Node_Table_Kept&) = delete;
-  Node_Table_Kept& operator=(const Node_Table_Kept&) = delete;
-  ~Node_Table_Kept() {
-    std::copy(std::begin(nodes_), std::end(nodes_), global_node_tbl);
-    global_num_nodes = count_;
-  }
-
- private:
-  Hb_Boolean nodes_[HB_MAX_NODES];
-  const int32_t count_ = global_num_nodes;
-};
-
+// The marks of nodes are those of the table in force, whatever the trial makes of them.
 Hb_Rc build_trial_table(Hb_Configuration_Internal& trial) {
-  const Node_Table_Kept kept;
-  return hb_vex_update_global_tbl(&trial, nullptr, nullptr, nullptr);
+  const Node_Marks marks;
+  const Hb_Rc rc = hb_vex_update_global_tbl(&trial, nullptr, nullptr, nullptr);
+  marks.put_back();
+  return rc;
 }
 
 // Fails when the platform does not have this node under its number, or not all nodes of the daemon.

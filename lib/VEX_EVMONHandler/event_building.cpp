@@ -125,23 +125,33 @@ void finish(Hb_VEX_Event* event, zu_int32_t kind, zu_int32_t count) {
   trace_values(Trace_Info, trace_adapters_on_node, kind, count);
 }
 
+bool is_up_on(const zu_vex_net_intf_info_t& interface, zu_int32_t node) {
+  return interface.node_number == static_cast<uint32_t>(node) && interface.status == ZU_VEX_INTF_STATUS_UP;
+}
+
 // The node's interfaces that are up are named in the event, as far as the configuration knows them. One may be listed
 // several times.
-Hb_Rc bring_adapters_up(zu_int32_t node, Adapter_Event& event, const zu_vex_net_intf_info_t* interfaces) {
+Hb_Rc name_joining_adapters(zu_int32_t node, Adapter_Event& event, const zu_vex_net_intf_info_t* interfaces) {
   for (const zu_vex_net_intf_info_t& interface : records_of(interfaces)) {
-    if (interface.node_number != static_cast<uint32_t>(node) || interface.status != ZU_VEX_INTF_STATUS_UP) {
+    if (!is_up_on(interface, node)) {
       continue;
     }
     const Hb_Adapter* named = find_adapter_of_interface(table_about_to_take_effect(), interface);
     if (named != nullptr && !event.name_once(named->Hb_adapter_num)) {
       return fail(HB_ENOMEM);
     }
-    Hb_Adapter* present = find_adapter_of_interface(global_config_tbl, interface);
+  }
+  return Hb_Success;
+}
+
+// In the table in force, once all of them are named.
+void bring_adapters_up(zu_int32_t node, const zu_vex_net_intf_info_t* interfaces) {
+  for (const zu_vex_net_intf_info_t& interface : records_of(interfaces)) {
+    Hb_Adapter* present = is_up_on(interface, node) ? find_adapter_of_interface(global_config_tbl, interface) : nullptr;
     if (present != nullptr) {
       present->Hb_state = Hb_Entity_Up;
     }
   }
-  return Hb_Success;
 }
 
 Hb_Rc construct_adapter_join(zu_int32_t node, Adapter_Event& event) {
@@ -156,7 +166,11 @@ Hb_Rc construct_adapter_join(zu_int32_t node, Adapter_Event& event) {
     return Hb_Failure;
   }
   const Interface_List interfaces(list);
-  return bring_adapters_up(node, event, interfaces.get());
+  if (name_joining_adapters(node, event, interfaces.get()) != Hb_Success) {
+    return Hb_Failure;
+  }
+  bring_adapters_up(node, interfaces.get());
+  return Hb_Success;
 }
 
 }  // namespace

@@ -1,24 +1,19 @@
 // What a table that was rebuilt for the report of one node changes for the members of other nodes.
 #pragma once
 
-#include <memory>
 #include <utility>
 
 #include "VEX_EVMONHandler.h"
-
-using Event = std::unique_ptr<Hb_VEX_Event>;
-
-inline void append_event(Event event) {
-  if (event != nullptr) {
-    VEX_add_event_at_end(event.release());
-  }
-}
+#include "owned_event.h"
 
 class Changes_Of_Others {
  public:
   // From the table in force to the rebuilt one, without a node of each kind. Fails when there is no memory for an
   // event.
   Hb_Rc find(EVMONHandler& handler, zu_int32_t no_death_of, zu_int32_t no_join_of);
+
+  // The joins of adapters with no node left out, for when the cluster services do not tell who joins with a node.
+  Hb_Rc find_adapter_joins(EVMONHandler& handler);
 
   bool has_deaths() const { return adapter_death_ != nullptr || node_death_ != nullptr; }
 
@@ -27,8 +22,8 @@ class Changes_Of_Others {
   void append_joins();
 
  private:
-  Event adapter_death_;
-  Event node_death_;
-  Event node_join_;
-  Event adapter_join_;
+  Owned_Event adapter_death_;
+  Owned_Event node_death_;
+  Owned_Event node_join_;
+  Owned_Event adapter_join_;
 };

@@ -31,9 +31,9 @@ void trace_report(Trace_Record record, const Report& report) {
 
 // Everything of a death or a return that takes memory.
 struct Report_Events {
-  Event configuration;
-  Event node;      // of a death
-  Event adapters;  // of the node, when there are any
+  Owned_Event configuration;
+  Owned_Event node;      // of a death
+  Owned_Event adapters;  // of the node, when there are any
   Changes_Of_Others others;
 };
 
@@ -237,8 +237,10 @@ Hb_Rc Node_Change::make_return(Report_Events& events) {
   Hb_VEX_Event* adapters = nullptr;
   const Hb_Rc rc = handler_.constructAdapterEventOnNode(node_, &adapters, HB_EVENT_JOIN);
   events.adapters.reset(adapters);
-  // Without an answer about its adapters the node is told alone.
-  return rc != Hb_Success && hb_get_errno() == HB_ENOMEM ? Hb_Failure : Hb_Success;
+  if (rc == Hb_Success) {
+    return Hb_Success;
+  }
+  return hb_get_errno() == HB_ENOMEM ? Hb_Failure : events.others.find_adapter_joins(handler_);
 }
 
 Hb_Rc Node_Change::tell_return(Report_Events& events) {

@@ -116,6 +116,7 @@ Hb_Rc queue_adapter_deaths(EVMONHandler& handler, const Report& report) {
     }
     if (adapters != nullptr) {
       VEX_add_event_at_end(adapters);
+      mark_adapters_down_in_waiting_table(report.remote_node_numbers[index]);
     }
   }
   return rc;

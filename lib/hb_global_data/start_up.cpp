@@ -90,6 +90,8 @@ Hb_Rc start_vex(zu_vex_net_intf_info_t** p_interfaces) {
     }
   }
   forget_adapter_tables();
+  // A new table that still waits belongs to the last start.
+  empty_global_config_table(&global_config_tbl_new);
   zu_vex_net_intf_info_t* interfaces = nullptr;
   if (!daemon_mode && start_vex(&interfaces) != Hb_Success) {
     return Hb_Failure;

@@ -104,6 +104,16 @@ class MoveToVex : public testing::Test {
   Caller caller;
 };
 
+TEST_F(MoveToVex, TheDaemonEndsWithTheLastClientThatMoves) {
+  start_with_daemon();
+  life.emplace(4);
+  move();
+  EXPECT_EQ(0, daemon_.wait_for_end()) << daemon_.log();
+  life->node_dies(2, ZU_VEX_NODE_DOWN_REASON_NONE);
+  caller.take_all();
+  expect_true_picture();
+}
+
 TEST_F(MoveToVex, AClientThatMovesGoesOnFromWhereItWas) {
   start_with_daemon();
   life.emplace(4);

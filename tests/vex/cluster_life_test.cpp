@@ -5,11 +5,15 @@
 
 #include <algorithm>
 #include <array>
+#include <cerrno>
 #include <csignal>
 #include <functional>
 #include <vector>
 
+#include "VEX_migration.h"
+#include "hb_client/vex.h"
 #include "hb_global_data/state.h"
+#include "platform_doubles.h"
 #include "scripted_life.h"
 #include "support/process_state.h"
 #include "support/running_client.h"
@@ -342,6 +346,57 @@ TEST_F(ClusterLife, AnInterfaceThatGoesWhenItsNodeHasReturnedIsToldOnce) {
   take();
   EXPECT_THAT(deaths(), IsEmpty());
   EXPECT_THAT(joins(), ElementsAre("3", "3/en0"));
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, ANewTableThatWaitsWhenTheClientStopsIsNotTheNextStarts) {
+  start();
+  life->node_dies(3, ZU_VEX_NODE_DOWN_REASON_NONE);
+  ASSERT_TRUE(caller.take_one());  // the adapters; the node and the configuration wait
+  ASSERT_EQ(Hb_Success, hb_terminate());
+  scripted_cluster().reset();
+  life.emplace(8);
+  Caller again;
+  ASSERT_EQ(Hb_Success, again.start());
+  again.take_all();
+  EXPECT_EQ(life->nodes_up(), again.nodes_up);
+  EXPECT_EQ(life->adapters_up(), again.adapters_up);
+  caller.configured_nodes = again.configured_nodes;
+  expect_true_states();
+}
+
+TEST_F(ClusterLife, WhoIsBackWhileTheDeathWaitsIsToldBack) {
+  start();
+  life->node_dies(3, ZU_VEX_NODE_DOWN_REASON_NONE);
+  hb_refresh_boot_ip_addrs_and_update_events();
+  life->node_returns(3);
+  hb_refresh_boot_ip_addrs_and_update_events();
+  take();
+  EXPECT_THAT(deaths(), ElementsAre("3", "3/en0", "3/en1"));
+  EXPECT_THAT(joins(), ElementsAre("3", "3/en0", "3/en1"));
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, AReturnTellsTheAdaptersAlsoWhenTheyCannotBeAskedForAgain) {
+  start();
+  after("a death", [&] { life->node_dies(3, ZU_VEX_NODE_DOWN_REASON_NONE); });
+  life->node_returns(3);
+  const auto present = scripted_cluster().new_interfaces(scripted_cluster().interfaces);
+  platform_double().net_intf_info.answers = {{0, present}, {-1, nullptr, EIO}};
+  take();
+  EXPECT_THAT(joins(), ElementsAre("3", "3/en0", "3/en1"));
+  expect_true_picture();
+}
+
+TEST_F(ClusterLife, StatesThatAreToldAreInForceAfterAPreparationThatWasGivenUp) {
+  start();
+  migrate_to_vex_prep = true;
+  life->interface_dies(3, "en1");
+  hb_refresh_boot_ip_addrs_and_update_events();
+  ASSERT_TRUE(caller.take_one());
+  life->interface_returns(3, "en1");
+  take();
+  migrate_to_vex_prep = false;
   expect_true_picture();
 }
 

@@ -344,19 +344,22 @@ TEST_F(ConfigurationUpdate, ASecondConfigurationEventLeavesTheTableInForce) {
 }
 
 // With neither deaths nor joins the refreshed table takes effect at once, and the event that waits finds none.
-TEST_F(ConfigurationUpdate, ARefreshWhileAConfigurationEventWaitsDoesNotEmptyTheTableInForce) {
+TEST_F(ConfigurationUpdate, ARefreshThatFindsADeadNodeBackWhileItsDeathWaitsTellsItBackBehindIt) {
   EVMONAdapterEventHandler adapters(path);
   adapter_event_handler_p = &adapters;
   node_goes_down(3);
   EXPECT_EQ(update_with_notification(), Hb_Success);
   EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration"));
+  const Hb_Adapter* before = global_config_tbl.Hb_global_adapter_list;
   scripted_cluster().nodes[2].status = ZU_VEX_NODE_STATUS_UP;
   hb_refresh_boot_ip_addrs_and_update_events();
-  EXPECT_EQ(global_config_tbl_new.node_list, nullptr);
-  for (int i = 0; i < 2; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
+  EXPECT_THAT(queued(), ElementsAre("nodes 1: 3", "configuration", "configuration", "nodes 2: 3"));
+  EXPECT_EQ(global_config_tbl.Hb_global_adapter_list, before);
+  for (int i = 0; i < 3; ++i) EXPECT_EQ(out.call(*pipe_handler), Hb_Success);
   EXPECT_EQ(out.events, 128);
   EXPECT_STREQ(out.name, "Hb_Config_Group");
   ASSERT_EQ(global_config_tbl.Hb_num_nodes, 3);
+  EXPECT_EQ(find_configured_node(3)->state, Hb_Entity_Up);
   EXPECT_NE(find_configured_adapter(144), nullptr);
   adapter_event_handler_p = nullptr;
 }
@@ -399,6 +402,13 @@ TEST_F(ConfigurationUpdate, OfAMovingClientWithoutADifferenceTellsNothing) {
   EXPECT_THAT(queued(), IsEmpty());
   EXPECT_EQ(waiting_bytes(ends.read()), 0);
   EXPECT_EQ(global_config_tbl.Hb_global_adapter_list, before);
+}
+
+TEST_F(ConfigurationUpdate, OfAMovingClientWithNothingButStatesQueuesTheConfigurationToo) {
+  migrate_to_vex_prep = true;
+  adapter_of_node_goes_down(2);
+  EXPECT_EQ(update(), Hb_Success);
+  EXPECT_THAT(queued(), ElementsAre("adapters 1: 96", "configuration"));
 }
 
 TEST_F(ConfigurationUpdate, OfAMovingClientWithAnotherAddressQueuesTheConfiguration) {

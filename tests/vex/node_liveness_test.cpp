@@ -393,12 +393,13 @@ TEST_F(NodeLiveness, AReturnLeavesTheRebuiltTableToTheConfigurationEvent) {
   EXPECT_TRUE(Monitored_Client::is_configured(5));
 }
 
-TEST_F(NodeLiveness, AReturnWithoutAnAnswerAboutAdaptersIsToldAlone) {
+TEST_F(NodeLiveness, AReturnWithoutAnAnswerAboutAdaptersIsToldWithThoseOfTheRebuiltTable) {
   Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_LINK_Down);
   platform_double().net_intf_info.answers = {{0, nullptr, 0, true}, {-1, nullptr}};
   EXPECT_EQ(Hb_Success, up(3));
   EXPECT_EQ(2, out.events);
-  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
+  EXPECT_THAT(Monitored_Client::queue(),
+              ElementsAre(configuration_event, Queued_Event{2, {adapter(3, 0), adapter(3, 1)}, 2}));
 }
 
 // Others.
