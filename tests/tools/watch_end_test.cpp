@@ -36,7 +36,10 @@ class HbctlWatchEnd : public testing::Test {
     return *child_;
   }
 
-  void send_death(uint32_t sequence) { daemon_.send_nodes(5, "hbctl.nodes", sequence, {1, 0, 0}); }
+  static Bytes death(uint32_t sequence) {
+    return framed(ReplyPacket(5).name("hbctl.nodes").sequence(sequence).message(node_event_message({1, 0, 0})).bytes());
+  }
+  void send_death(uint32_t sequence) { daemon_.connection().send_raw(death(sequence)); }
 
   void expect_clean_end(ChildProcess& child) {
     daemon_.expect_withdrawal("hbctl.nodes");
@@ -53,7 +56,8 @@ class HbctlWatchEnd : public testing::Test {
 TEST_F(HbctlWatchEnd, comes_after_so_many_events) {
   ChildProcess& child = start({"--count", "2"});
   child.read_line();
-  for (uint32_t sequence = 1; sequence <= 3; ++sequence) send_death(sequence);
+  // In one piece: behind the second one the watch may be gone.
+  daemon_.connection().send_raw(death(1) + death(2) + death(3));
   EXPECT_THAT(child.read_line(), HasSubstr("       1  node     death"));
   EXPECT_THAT(child.read_line(), HasSubstr("       2  node     death"));
   daemon_.expect_withdrawal("hbctl.nodes");
