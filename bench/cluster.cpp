@@ -2,10 +2,12 @@
 
 #include <arpa/inet.h>
 
+#include <algorithm>
 #include <cstring>
 #include <numeric>
 #include <random>
 #include <string>
+#include <string_view>
 
 #include "hb_protocol/framing.h"
 
@@ -25,9 +27,8 @@ std::vector<uint32_t> random_cycle(size_t length) {
   return next;
 }
 
-void put_text(char* field, size_t size, const std::string& text) {
-  std::memcpy(field, text.c_str(), std::min(size, text.size() + 1));
-}
+// Into a field of zeros, whose last one stays.
+void put_text(char* field, size_t size, std::string_view text) { text.copy(field, size - 1); }
 
 Hb_Adapter adapter_record(const Cluster& cluster, uint32_t number, uint32_t number_in_its_address) {
   const auto slot = static_cast<int>(number) % cluster.adapters_per_node;
@@ -116,10 +117,10 @@ Bytes failure_data_event(size_t message_size) {
 }
 
 Bytes framed(const Bytes& packet) {
-  Bytes bytes;
-  bytes.reserve(HB_FRAME_PREFIX_SIZE + packet.size());
-  append(bytes, static_cast<hb_frame_length>(packet.size()));
-  bytes.insert(bytes.end(), packet.begin(), packet.end());
+  const auto length = static_cast<hb_frame_length>(packet.size());
+  Bytes bytes(HB_FRAME_PREFIX_SIZE + packet.size());
+  std::memcpy(bytes.data(), &length, sizeof length);
+  std::copy(packet.begin(), packet.end(), bytes.begin() + HB_FRAME_PREFIX_SIZE);
   return bytes;
 }
 
