@@ -15,7 +15,7 @@
 #include <random>
 #include <vector>
 
-#include "temporary_directory.h"
+#include "support/temporary_directory.h"
 
 namespace {
 

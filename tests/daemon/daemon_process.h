@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "temporary_directory.h"
+#include "support/temporary_directory.h"
 
 /** A running hbd. Its log goes to a file; the test stops it, or the end of the object does. */
 class DaemonProcess {

@@ -5,7 +5,7 @@
 #include <sys/stat.h>
 
 #include "failure.h"
-#include "temporary_directory.h"
+#include "support/temporary_directory.h"
 
 namespace {
 

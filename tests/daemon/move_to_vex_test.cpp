@@ -14,7 +14,7 @@
 #include "daemon_process.h"
 #include "support/process_state.h"
 #include "support/running_client.h"
-#include "temporary_directory.h"
+#include "support/temporary_directory.h"
 
 namespace hb_test {
 namespace {

@@ -13,10 +13,10 @@
 #include <string>
 
 #include "child_process.h"
-#include "daemon/temporary_directory.h"
 #include "publisher.h"
 #include "sealed_route.h"
 #include "stale_objects.h"
+#include "support/temporary_directory.h"
 
 namespace hb_test {
 namespace {

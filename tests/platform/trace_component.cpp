@@ -1,6 +1,7 @@
 #include "trace_component.h"
 
 #include <cstdlib>
+#include <fstream>
 #include <regex>
 #include <sstream>
 
@@ -16,6 +17,12 @@ void set_variable(const char* name, const char* value) {
   }
 }
 
+std::vector<std::string> lines_of(std::istream& stream) {
+  std::vector<std::string> lines;
+  for (std::string line; std::getline(stream, line);) lines.push_back(line);
+  return lines;
+}
+
 }  // namespace
 
 int Trace_Component::register_it() {
@@ -28,6 +35,11 @@ void set_trace(const char* place, const char* detail) {
   set_variable("ZU_TRACE_DETAIL", detail);
 }
 
+std::vector<std::string> lines_of_file(const std::string& path) {
+  std::ifstream file(path);
+  return lines_of(file);
+}
+
 std::vector<std::string> without_times(const std::vector<std::string>& lines) {
   static const std::regex time(R"(^\d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\.\d{6}[+-]\d\d:\d\d )");
   std::vector<std::string> out;
@@ -38,7 +50,5 @@ std::vector<std::string> without_times(const std::vector<std::string>& lines) {
 
 std::vector<std::string> without_times(const std::string& text) {
   std::istringstream stream(text);
-  std::vector<std::string> lines;
-  for (std::string line; std::getline(stream, line);) lines.push_back(line);
-  return without_times(lines);
+  return without_times(lines_of(stream));
 }

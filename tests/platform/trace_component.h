@@ -22,6 +22,8 @@ struct Trace_Component {
 // Sets the two variables that switch trace; a null value removes one.
 void set_trace(const char* place, const char* detail);
 
+std::vector<std::string> lines_of_file(const std::string& path);
+
 // The lines of `text` without their times; a line that does not begin with a time is given back as it is.
 std::vector<std::string> without_times(const std::vector<std::string>& lines);
 std::vector<std::string> without_times(const std::string& text);

@@ -5,7 +5,7 @@
 #include <cstdlib>
 
 #include "child_process.h"
-#include "scratch_directory.h"
+#include "support/temporary_directory.h"
 #include "trace_component.h"
 
 extern "C" char* secure_getenv(const char*) noexcept { return nullptr; }
@@ -13,7 +13,7 @@ extern "C" char* secure_getenv(const char*) noexcept { return nullptr; }
 namespace {
 
 TEST(TraceOfAPrivilegedProgram, IsNotSwitchedOnByTheEnvironment) {
-  const Scratch_Directory directory;
+  const TemporaryDirectory directory;
   const std::string path = directory.path("trace");
   const Child_Result child = run_in_child([&] {
     set_trace(("file:" + path).c_str(), "debug");

@@ -7,7 +7,7 @@
 #include <thread>
 
 #include "child_process.h"
-#include "scratch_directory.h"
+#include "support/temporary_directory.h"
 #include "trace_component.h"
 
 using testing::Each;
@@ -175,7 +175,7 @@ TEST(TraceRecord, IsNotCutShortByCancellation) {
 TEST(TraceRecord, OfSeveralThreadsStayWholeLines) {
   constexpr int threads = 4;
   constexpr int records = 250;
-  const Scratch_Directory directory;
+  const TemporaryDirectory directory;
   const std::string path = directory.path("trace");
   const Child_Result child = run_in_child([&] {
     set_trace(("file:" + path).c_str(), nullptr);

@@ -7,7 +7,7 @@
 #include <filesystem>
 
 #include "child_process.h"
-#include "scratch_directory.h"
+#include "support/temporary_directory.h"
 #include "trace_component.h"
 
 using testing::Each;
@@ -125,9 +125,8 @@ TEST(TraceSwitch, DestinationIsReadByTheFirstRegistrationOfTheProcess) {
 }
 
 TEST(TraceToAFile, IsAddedToWhatIsThere) {
-  const Scratch_Directory directory;
-  const std::string path = directory.path("trace");
-  write_file(path, "what was there\n");
+  const TemporaryDirectory directory;
+  const std::string path = directory.write("trace", "what was there\n");
   const Child_Result child = trace_with(("file:" + path).c_str(), "errors", {1, 0, 0});
   EXPECT_EQ(child.exit_status, 0);
   EXPECT_EQ(child.errors, "");
@@ -135,7 +134,7 @@ TEST(TraceToAFile, IsAddedToWhatIsThere) {
 }
 
 TEST(TraceToAFile, StandsThereAsSoonAsTheRecordIsMade) {
-  const Scratch_Directory directory;
+  const TemporaryDirectory directory;
   const std::string path = directory.path("trace");
   const Child_Result child = run_in_child([&] {
     set_trace(("file:" + path).c_str(), nullptr);
@@ -148,7 +147,7 @@ TEST(TraceToAFile, StandsThereAsSoonAsTheRecordIsMade) {
 }
 
 TEST(TraceToAFile, IsOneFileForTwoComponents) {
-  const Scratch_Directory directory;
+  const TemporaryDirectory directory;
   const std::string path = directory.path("trace");
   const Child_Result child = run_in_child([&] {
     set_trace(("file:" + path).c_str(), nullptr);
@@ -166,7 +165,7 @@ TEST(TraceToAFile, IsOneFileForTwoComponents) {
 }
 
 TEST(TraceToAFile, IsNotInheritedByProgramsThatAreStarted) {
-  const Scratch_Directory directory;
+  const TemporaryDirectory directory;
   const std::string path = directory.path("trace");
   const Child_Result child = run_in_child([&] {
     set_trace(("file:" + path).c_str(), nullptr);
@@ -184,16 +183,15 @@ TEST(TraceToAFile, IsNotInheritedByProgramsThatAreStarted) {
 }
 
 TEST(TraceToAFile, ThatCannotBeWrittenIsToldAndTraceStaysOff) {
-  const Scratch_Directory directory;
-  write_file(directory.path("plain"), "");
-  const std::string path = directory.path("plain/trace");
+  const TemporaryDirectory directory;
+  const std::string path = directory.write("plain", "") + "/trace";
   const Child_Result child = trace_with(("file:" + path).c_str(), nullptr, {0, 0, 0});
   EXPECT_EQ(child.exit_status, 0);
   EXPECT_EQ(child.errors, "libzu_tr: cannot write trace to " + path + ": Not a directory; trace stays off\n");
 }
 
 TEST(TraceToAFile, InAMissingDirectoryDoesNotCreateIt) {
-  const Scratch_Directory directory;
+  const TemporaryDirectory directory;
   const std::string path = directory.path("missing/trace");
   const Child_Result child = trace_with(("file:" + path).c_str(), nullptr, {0, 0, 0});
   EXPECT_EQ(child.exit_status, 0);

@@ -13,7 +13,6 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
-#include <filesystem>
 #include <initializer_list>
 #include <stdexcept>
 #include <system_error>
@@ -164,17 +163,10 @@ FakeDaemon::~FakeDaemon() {
   }
   withdraw();
   ::close(listener_);
-  std::error_code ignored;
-  std::filesystem::remove_all(directory_, ignored);
 }
 
 // Keys are made of few bits of the socket's file: where another test has the same, another file is taken.
 void FakeDaemon::listen_and_publish() {
-  char directory[] = "/tmp/hb_test.XXXXXX";
-  if (mkdtemp(directory) == nullptr) {
-    throw_errno("mkdtemp");
-  }
-  directory_ = directory;
   for (int attempt = 0; attempt < 50; ++attempt) {
     if (listen_at("socket" + std::to_string(attempt)) && publish()) {
       return;
@@ -186,7 +178,7 @@ void FakeDaemon::listen_and_publish() {
 }
 
 bool FakeDaemon::listen_at(const std::string& name) {
-  path_ = directory_ + "/" + name;
+  path_ = directory_.path(name);
   sockaddr_un address{};
   address.sun_family = AF_UNIX;
   path_.copy(address.sun_path, sizeof address.sun_path - 1);

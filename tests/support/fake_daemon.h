@@ -14,6 +14,7 @@
 #include <utility>
 
 #include "support/bytes.h"
+#include "support/temporary_directory.h"
 
 namespace hb_test {
 
@@ -101,7 +102,7 @@ class FakeDaemon {
   FakeDaemon& operator=(const FakeDaemon&) = delete;
 
   const std::string& path() const { return path_; }
-  const std::string& directory() const { return directory_; }
+  const std::string& directory() const { return directory_.path(); }
 
   // The next client. Waits at most ten seconds, then throws.
   DaemonConnection accept();
@@ -140,7 +141,7 @@ class FakeDaemon {
   void withdraw();
 
   Publication publication_;
-  std::string directory_;
+  TemporaryDirectory directory_;
   std::string path_;
   std::shared_ptr<StopSignal> stop_ = std::make_shared<StopSignal>();
   int listener_ = -1;

@@ -7,12 +7,11 @@
 #include <algorithm>
 #include <csignal>
 #include <cstdlib>
-#include <filesystem>
-#include <fstream>
 #include <memory>
 #include <nlohmann/json.hpp>
 
 #include "hbctl_process.h"
+#include "support/temporary_directory.h"
 
 namespace hb_test {
 namespace {
@@ -94,26 +93,20 @@ enabled = true
 class HbctlWithDaemon : public testing::Test {
  protected:
   HbctlWithDaemon() {
-    char directory[] = "/tmp/hb_test.XXXXXX";
-    directory_ = mkdtemp(directory);
-    std::ofstream(directory_ + "/scenario.toml") << kScenario;
     for (const char* variable : {"HA_DOMAIN_NAME", "HA_SYSPAR_NAME"}) unsetenv(variable);
-    setenv("HB_SERVER_SOCKET", (directory_ + "/socket").c_str(), 1);
+    setenv("HB_SERVER_SOCKET", directory_.path("socket").c_str(), 1);
     start_daemon();
   }
-  ~HbctlWithDaemon() override {
-    stop_daemon();
-    std::filesystem::remove_all(directory_);
-  }
+  ~HbctlWithDaemon() override { stop_daemon(); }
 
   // The timeline waits for the three subscriptions of a watch and goes on as it reads.
   void start_daemon() {
     int ready[2] = {-1, -1};
     ASSERT_EQ(pipe(ready), 0);
     ASSERT_EQ(fcntl(ready[0], F_SETFD, FD_CLOEXEC), 0);
-    daemon_ = std::make_unique<ChildProcess>(
-        std::vector<std::string>{HBD_PATH, "--scenario", directory_ + "/scenario.toml", "--as-fast-as-read",
-                                 "--start-after-subscriptions", "3", "--ready-fd", std::to_string(ready[1])});
+    daemon_ = std::make_unique<ChildProcess>(std::vector<std::string>{
+        HBD_PATH, "--scenario", directory_.write("scenario.toml", kScenario), "--as-fast-as-read",
+        "--start-after-subscriptions", "3", "--ready-fd", std::to_string(ready[1])});
     close(ready[1]);
     pollfd entry{ready[0], POLLIN, 0};
     ASSERT_EQ(poll(&entry, 1, 30000), 1);
@@ -131,7 +124,7 @@ class HbctlWithDaemon : public testing::Test {
 
   static Finished run(const std::vector<std::string>& arguments) { return ChildProcess(hbctl(arguments)).finish(); }
 
-  std::string directory_;
+  TemporaryDirectory directory_;
   std::unique_ptr<ChildProcess> daemon_;
 };
 

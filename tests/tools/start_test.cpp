@@ -2,11 +2,11 @@
 #include <gmock/gmock.h>
 
 #include <cstdlib>
-#include <filesystem>
 #include <nlohmann/json.hpp>
 
 #include "hbctl_process.h"
 #include "played_daemon.h"
+#include "support/temporary_directory.h"
 
 namespace hb_test {
 namespace {
@@ -18,17 +18,14 @@ using testing::StartsWith;
 class HbctlStart : public testing::Test {
  protected:
   HbctlStart() {
-    char directory[] = "/tmp/hb_test.XXXXXX";
-    directory_ = mkdtemp(directory);
     for (const char* variable : {"HB_SERVER_SOCKET", "HA_DOMAIN_NAME", "HA_SYSPAR_NAME"}) unsetenv(variable);
   }
-  ~HbctlStart() override { std::filesystem::remove_all(directory_); }
 
-  std::string absent() const { return directory_ + "/absent"; }
+  std::string absent() const { return directory_.path("absent"); }
 
   static Finished run(const std::vector<std::string>& arguments) { return ChildProcess(hbctl(arguments)).finish(); }
 
-  std::string directory_;
+  TemporaryDirectory directory_;
 };
 
 TEST_F(HbctlStart, without_a_daemon_names_the_socket_the_error_and_how_to_start_one) {
@@ -126,7 +123,7 @@ TEST_F(HbctlStart, connects_to_exactly_the_socket_that_the_option_names) {
 }
 
 TEST_F(HbctlStart, with_a_path_that_no_address_can_hold_is_refused) {
-  const std::string path = directory_ + "/" + std::string(120, 'x');
+  const std::string path = directory_.path(std::string(120, 'x'));
   const Finished finished = run({"nodes", "--socket", path});
   EXPECT_THAT(finished.errors, StartsWith("hbctl: no daemon answers on " + path + ": HB_ECONNECT (15)"));
   EXPECT_EQ(finished.status, 3);

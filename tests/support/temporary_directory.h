@@ -1,21 +1,20 @@
-/* A directory of one test. */
-#ifndef HB_TESTS_DAEMON_TEMPORARY_DIRECTORY_H
-#define HB_TESTS_DAEMON_TEMPORARY_DIRECTORY_H
+// A directory of one test, for sockets and files.
+#pragma once
 
-#include <stdlib.h>
-
+#include <cerrno>
+#include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <stdexcept>
 #include <string>
+#include <system_error>
 
-/** Made anew, and removed with what is in it. */
+// Made anew, and removed with what is in it. Its name is short, as a socket's path has to be.
 class TemporaryDirectory {
  public:
   TemporaryDirectory() {
-    std::string name = "/tmp/hbd_test_XXXXXX";
+    std::string name = "/tmp/hb_test.XXXXXX";
     if (mkdtemp(name.data()) == nullptr) {
-      throw std::runtime_error("mkdtemp failed");
+      throw std::system_error(errno, std::generic_category(), "making the directory " + name);
     }
     path_ = name;
   }
@@ -26,10 +25,12 @@ class TemporaryDirectory {
     std::filesystem::remove_all(path_, ignored);
   }
 
-  /** Path of a file in it. */
+  [[nodiscard]] const std::string& path() const { return path_; }
+
+  // Path of a file in it.
   [[nodiscard]] std::string path(const std::string& name) const { return path_ + "/" + name; }
 
-  /** Writes a file and returns its path. */
+  // Writes a file and returns its path.
   [[nodiscard]] std::string write(const std::string& name, const std::string& text) const {
     std::ofstream(path(name)) << text;
     return path(name);
@@ -38,5 +39,3 @@ class TemporaryDirectory {
  private:
   std::string path_;
 };
-
-#endif
