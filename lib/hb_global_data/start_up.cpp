@@ -3,6 +3,7 @@
 #include <cstring>
 
 #include "VEX_HBC_trace.h"
+#include "VEX_migration.h"
 #include "hb_communication/connection.h"
 #include "hb_communication/shared_memory.h"
 #include "hb_communication/vex_table_build.h"
@@ -74,6 +75,14 @@ Hb_Rc start_vex(zu_vex_net_intf_info_t** p_interfaces) {
   return rc;
 }
 
+// The event behind it may still be in the queue, which outlives the stop. A client that never was in VEX mode nor
+// prepared for it has none.
+void drop_waiting_table() {
+  if (IsVEX != Hb_False || migrate_to_vex_prep) {
+    empty_global_config_table(&global_config_tbl_new);
+  }
+}
+
 // Kept out of hb_init(), which every query goes through.
 [[gnu::cold, gnu::noinline]] Hb_Rc start() {
   make_mutex_once();
@@ -90,8 +99,6 @@ Hb_Rc start_vex(zu_vex_net_intf_info_t** p_interfaces) {
     }
   }
   forget_adapter_tables();
-  // A new table that still waits belongs to the last start.
-  empty_global_config_table(&global_config_tbl_new);
   zu_vex_net_intf_info_t* interfaces = nullptr;
   if (!daemon_mode && start_vex(&interfaces) != Hb_Success) {
     return Hb_Failure;
@@ -118,6 +125,7 @@ Hb_Rc hb_terminate(void) {
   VEX_delete_global_event_handlers();
   hb_detach_shared_memory();
   hb_deinit_global_config_and_node_tbl();
+  drop_waiting_table();
   client_initialized = Hb_False;
   IsVEX = Hb_False;
   hb_remove_client_select();

@@ -129,14 +129,14 @@ bool learn_cluster_name() {
   return true;
 }
 
-bool has_no_handler() {
-  const EVMONHandler* const handlers[] = {
-      adapter_event_handler_p, event_pipe_handler_p,    ip_change_handler_p,        new_group_event_handler_p,
-      node_list_handler_p,     node_liveness_handler_p, peer_GS_liveness_handler_p, cluster_reconfig_handler_p,
-      site_config_handler_p,   split_merge_handler_p,
+// One that is open shows that the platform has monitors.
+bool is_a_monitor_open() {
+  EVMONHandler* const handlers[] = {
+      adapter_event_handler_p,    ip_change_handler_p,        node_list_handler_p,   node_liveness_handler_p,
+      peer_GS_liveness_handler_p, cluster_reconfig_handler_p, site_config_handler_p, split_merge_handler_p,
   };
-  return std::all_of(std::begin(handlers), std::end(handlers),
-                     [](const EVMONHandler* each) { return each == nullptr; });
+  return std::any_of(std::begin(handlers), std::end(handlers),
+                     [](EVMONHandler* each) { return each != nullptr && each->getFileDescriptor() != -1; });
 }
 
 // Whether the absence of all monitors is an error to be traced, in its scope.
@@ -151,17 +151,23 @@ class Absence_Allowed {
   const bool before_;
 };
 
-// A platform without monitors has no handler; where there is one already, the others are missed.
-Creation open_first_monitor() {
-  const bool may_be_absent = has_no_handler();
+// A monitor that is missed where another one is open is as one that cannot be opened.
+Creation open(Monitor& monitor) {
+  const bool may_be_absent = !is_a_monitor_open();
   const Absence_Allowed allowed(may_be_absent);
-  const Creation creation = monitors[0].open(monitors[0].path);
+  const Creation creation = monitor.open(monitor.path);
   return creation == Creation::absent && !may_be_absent ? Creation::failed : creation;
 }
 
-bool open_other_monitors() {
-  return std::all_of(std::begin(monitors) + 1, std::end(monitors),
-                     [](Monitor& monitor) { return monitor.open(monitor.path) == Creation::made; });
+// Up to the first one that was not made.
+Creation open_monitors() {
+  for (Monitor& monitor : monitors) {
+    const Creation creation = open(monitor);
+    if (creation != Creation::made) {
+      return creation;
+    }
+  }
+  return Creation::made;
 }
 
 template <typename Handler>
@@ -174,12 +180,12 @@ void remove(Handler*& slot) {
 
 Hb_Rc VEX_create_global_event_handlers_internal() {
   make_mutex_once();
-  const Creation first = open_first_monitor();
-  if (first == Creation::absent) {
+  const Creation opened = open_monitors();
+  if (opened == Creation::absent) {
     return Hb_Success;
   }
-  const bool is_complete = first == Creation::made && open_other_monitors() && make_event_pipe() &&
-                           make_new_group_pipe() && learn_cluster_name();
+  const bool is_complete =
+      opened == Creation::made && make_event_pipe() && make_new_group_pipe() && learn_cluster_name();
   return is_complete ? Hb_Success : Hb_Failure;
 }
 

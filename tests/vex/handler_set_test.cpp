@@ -338,6 +338,23 @@ TEST_F(HandlerSet, GoesWhenTheMonitorsAreAbsentButOneWasKept) {
   EXPECT_EQ(platform_double().traces_of(8)[0].block_value(1), 0xFFFFFFFFU);
 }
 
+// A pipe, or a monitor that could not be opened, is no sign that the platform has monitors.
+TEST_F(HandlerSet, OfPipesAndUnopenedMonitorsStaysWhereThereAreNoMonitors) {
+  scripted_cluster().reset();
+  char path[] = "/monitor";
+  Ends ends = new_pipe();
+  event_pipe_handler_p = new EVMONEventPipeHandler(ends.fds, nullptr);
+  node_liveness_handler_p = new EVMONNodeLivenessHandler(path);
+  peer_GS_liveness_handler_p = new EVMONPeerGSLivenessHandler(path);
+  const std::vector<EVMONHandler*> before = handlers();
+  set_hb_errno(12345);  // a number that nothing sets
+  start_tracing();
+  EXPECT_EQ(VEX_create_global_event_handlers(), Hb_Success);
+  EXPECT_EQ(handlers(), before);
+  EXPECT_THAT(trace_lines(), IsEmpty());
+  EXPECT_EQ(hb_get_errno(), 12345);
+}
+
 TEST_F(HandlerSet, IsDeletedTwiceWithoutHarm) {
   ASSERT_EQ(VEX_create_global_event_handlers(), Hb_Success);
   hb_delete_evmon_event_handlers();
@@ -429,6 +446,27 @@ TEST_F(StartedHandlerSet, GivesTheListsOfTheLastStartBackWhenTheClientStartsAgai
     hb_terminate();
     EXPECT_EQ(Scripted_Cluster::outstanding(), records_of_a_start) << start;
   }
+}
+
+// Nobody takes the event behind it any more.
+TEST_F(StartedHandlerSet, DropsATableThatWaitsWhenTheClientStops) {
+  ASSERT_EQ(start_with(hb_initialize_evmon_event_handlers), Hb_Success);
+  ASSERT_EQ(hb_vex_update_global_tbl(&global_config_tbl_new, nullptr, nullptr, nullptr), Hb_Success);
+  ASSERT_NE(global_config_tbl_new.node_list, nullptr);
+  hb_terminate();
+  EXPECT_EQ(global_config_tbl_new.node_list, nullptr);
+  EXPECT_EQ(global_config_tbl_new.Hb_max_nodes, 0);
+}
+
+TEST_F(StartedHandlerSet, LeavesTheTableThatIsBuiltNextToAStart) {
+  Hb_Node_config_state node = {};
+  global_config_tbl_new.node_list = &node;
+  global_config_tbl_new.Hb_num_nodes = 1;
+  EXPECT_EQ(start_with(hb_init), Hb_Success);
+  EXPECT_EQ(global_config_tbl_new.node_list, &node);
+  EXPECT_EQ(global_config_tbl_new.Hb_num_nodes, 1);
+  global_config_tbl_new = {};
+  hb_terminate();
 }
 
 // A refresh puts copies in the place of the platform's interfaces.

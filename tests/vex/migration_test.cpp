@@ -373,6 +373,17 @@ TEST_F(Migration, AnAbortClosesTheMonitorsThatAFailedTableLeft) {
   EXPECT_EQ(0U, handlers());
 }
 
+// The configuration event behind it stays in the queue, and a later start would take it.
+TEST_F(Migration, OfAnAbortedPreparationNoTableOutlivesTheStop) {
+  prepare();
+  ASSERT_EQ(Hb_Success, hb_vex_update_global_tbl(&global_config_tbl_new, nullptr, nullptr, nullptr));
+  hb_migrate_to_vex_abort();
+  EXPECT_EQ(3, global_config_tbl_new.Hb_num_nodes);
+  EXPECT_EQ(Hb_Success, hb_terminate());
+  EXPECT_EQ(nullptr, global_config_tbl_new.node_list);
+  EXPECT_EQ(0, global_config_tbl_new.Hb_num_nodes);
+}
+
 TEST_F(Migration, CanBePreparedAgainAfterAnAbortAndCommitted) {
   prepare();
   hb_migrate_to_vex_abort();
