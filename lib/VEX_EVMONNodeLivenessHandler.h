@@ -20,8 +20,8 @@
 // - A record that is no record (a null one) is as a read that failed.
 //
 // For a split or a merge:
-// - A missing list, or one of more nodes than a cluster has, is refused as a record of the other part is: nothing but
-//   the sequence number is written. Of other types of record the lists are not looked at; they have no event bits.
+// - A missing list, or one of more nodes than a cluster has, is as one that there is no memory for. Of other types of
+//   record the lists are not looked at; they have no event bits.
 // - When the caller cannot be woken for the deaths the call fails, with both lists in the group all the same.
 // - Without memory it fails with HB_ENOMEM, and nobody is marked down.
 #pragma once

@@ -26,30 +26,25 @@ void trace_no_memory(int line) {
   trace_data(Trace_Errors, trace_split_merge_no_memory, {block_of(error), block_of(file), block_of(line)});
 }
 
-bool is_list(const uint32_t* nodes, uint32_t count) {
-  return count <= HB_MAX_NODES && (count == 0 || nodes != nullptr);
-}
-
 bool is_split_or_merge(const Report& report) {
   return report.event_type == ZU_EVM_SUBCLUSTER_SPLIT || report.event_type == ZU_EVM_SUBCLUSTER_MERGE;
 }
 
-bool has_lists(const Report& report) {
-  return is_list(report.local_node_numbers, report.num_local_node_up) &&
-         is_list(report.remote_node_numbers, report.num_remote_node_up);
-}
-
-bool can_be_told(const Report& report) {
-  return report.event_subtype != ZU_EVM_SPLITMERGE_EVENT_SUBTYPE_REMOTE &&
-         (!is_split_or_merge(report) || has_lists(report));
-}
-
 // The array is the C allocator's, as hb_free_split_info() gives it back there. An empty one is a block, too.
-bool fill_subcluster(Hb_Subcluster_Info& subcluster, const uint32_t* nodes, uint32_t count) {
+uint32_t* copy_of(const uint32_t* nodes, uint32_t count) {
+  if (count > HB_MAX_NODES || (count != 0 && nodes == nullptr)) {
+    errno = ENOMEM;
+    return nullptr;
+  }
   auto* copy = static_cast<uint32_t*>(std::calloc(count != 0 ? count : 1, sizeof *nodes));
   if (copy != nullptr && count != 0) {
     std::memcpy(copy, nodes, count * sizeof *nodes);
   }
+  return copy;
+}
+
+bool fill_subcluster(Hb_Subcluster_Info& subcluster, const uint32_t* nodes, uint32_t count) {
+  uint32_t* copy = copy_of(nodes, count);
   subcluster.num_up_nodes = copy != nullptr ? count : 0;
   subcluster.node_numbers = copy;
   return copy != nullptr;
@@ -189,7 +184,7 @@ Hb_Rc EVMONNodeLivenessHandler::SplitMergeEventHandler(zu_evm_event_split_merge_
   if (record != nullptr) {
     trace_report(*record, evmon_fd);
     *seqnum_p = static_cast<Hb_Seq_Num>(record->sequence_number);
-    if (can_be_told(*record)) {
+    if (record->event_subtype != ZU_EVM_SPLITMERGE_EVENT_SUBTYPE_REMOTE) {
       rc = tell(*this, *record, {events, name, group, seqnum_p});
     }
   }
