@@ -111,16 +111,21 @@ void append_node_death(Owned_Event death) {
   }
 }
 
-void put_new_table_in_force() {
+Hb_Rc take_effect() {
   trace(Trace_Info, trace_update_takes_effect);
-  VEX_copy_and_delete_global_config_tbl();
+  if (put_waiting_table_in_force() != Hb_Success) {
+    return Hb_Failure;
+  }
   hb_vex_dump_global_table(&global_config_tbl, "Update global table: current table after copy");
+  return Hb_Success;
 }
 
-// Deaths come first. With deaths the old table stays until the configuration event behind them is taken, and so it does
-// behind an older table whose deaths are still in the queue: they name the old table's numbers.
+// With deaths the old table stays until the configuration event behind them is taken, and so it does behind an older
+// table whose deaths are still in the queue: they name the old table's numbers.
+bool takes_effect_at_once(const Changes& changes) { return !migrate_to_vex_prep && changes.config == nullptr; }
+
+// Deaths come first.
 void tell(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool at_once) {
-  const bool takes_effect = !migrate_to_vex_prep && changes.config == nullptr;
   if (migrate_to_vex_prep) {
     append_event(std::move(changes.adapter_death));
     if (at_once) {
@@ -135,9 +140,6 @@ void tell(EVMONHandler& handler, Changes& changes, const Vex_Outputs& out, bool 
   append_event(std::move(changes.adapter_join));
   append_event(std::move(changes.node_return));
   append_event(std::move(changes.adapter_return));
-  if (takes_effect) {
-    put_new_table_in_force();
-  }
 }
 
 Hb_Rc update(EVMONHandler& handler, const Vex_Outputs& out, zu_evm_event_metadata_t* metadata,
@@ -152,6 +154,9 @@ Hb_Rc update(EVMONHandler& handler, const Vex_Outputs& out, zu_evm_event_metadat
   {
     Changes changes;
     rc = prepare(handler, older.waiting(), changes);
+    if (rc == Hb_Success && takes_effect_at_once(changes)) {
+      rc = take_effect();
+    }
     if (rc != Hb_Success) {
       return rc;
     }

@@ -7,7 +7,8 @@
 // - When only nodes died, no death is delivered at once, and the caller gets the empty event.
 // - When an older new table still waits for its configuration event, this one waits in its place, and who is up again
 //   since is told as well: the death is in the queue, and the table in force does not know of it.
-// - Without memory for one of the events nothing is told, the table in force stays, and so does an older new table that
+// - Without memory for one of the events, or for the new table to take effect at once, nothing is told, the table in
+// force stays, and so does an older new table that
 //   waits for its configuration event: the next notification finds the same differences again.
 #pragma once
 
@@ -21,8 +22,8 @@ class EVMONConfigurationHandler : public EVMONHandler {
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
 
   // Builds the table anew, and tells the differences to the one in force: one by the outputs, the others by the queue.
-  // The group is written with a notification only. Fails as the table build does, with HB_ENOMEM, or when the caller
-  // cannot be woken.
+  // The group is written with a notification only. Fails as the table build does, with HB_ENOMEM, with HB_EVEXTBL_COPY
+  // (no memory to take effect), or when the caller cannot be woken.
   Hb_Rc update_global_table_and_construct_events(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p,
                                                  zu_evm_event_metadata_t* metadata, zu_vex_net_intf_info_t* interfaces);
 };

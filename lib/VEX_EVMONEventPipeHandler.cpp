@@ -4,12 +4,13 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <memory>
+#include <utility>
 
 #include "VEX_HBC_trace.h"
 #include "hb_communication/event_reception.h"
 #include "hb_communication/vex_table_build.h"
 #include "hb_global_data/record_index.h"
+#include "owned_event.h"
 #include "vex_outputs.h"
 
 namespace {
@@ -97,17 +98,16 @@ void deliver_group(EVMONHandler& handler, const Delivery& delivery, Hb_Group& fr
   delivery.copy(handler, &from, out.group);
 }
 
-// An event before this one may have put the new table in force.
-void deliver_configuration(const Vex_Outputs& out) {
+Hb_Rc deliver_configuration(const Vex_Outputs& out) {
   trace(Trace_Info, trace_delivering_configuration);
-  if (is_table_built(global_config_tbl_new)) {
-    VEX_copy_and_delete_global_config_tbl();
-  }
+  const Hb_Rc rc = put_waiting_table_in_force();
   hb_vex_dump_global_table(&global_config_tbl, "Event pipe handler: after copy");
   put_name(out.name, configuration_event_name);
+  return rc;
 }
 
-void deliver(EVMONHandler& handler, Hb_VEX_Event& event, const Vex_Outputs& out) {
+// Fails when there is no memory for a new configuration.
+Hb_Rc deliver(EVMONHandler& handler, Hb_VEX_Event& event, const Vex_Outputs& out) {
   *out.events = event.group.Hb_events;
   *out.seqnum = 0;
   for (const Delivery& delivery : deliveries) {
@@ -115,9 +115,13 @@ void deliver(EVMONHandler& handler, Hb_VEX_Event& event, const Vex_Outputs& out)
       deliver_group(handler, delivery, event.group, out);
     }
   }
-  if (event.group.Hb_events == HB_EVENT_CONFIGURATION) {
-    deliver_configuration(out);
-  }
+  return event.group.Hb_events == HB_EVENT_CONFIGURATION ? deliver_configuration(out) : Hb_Success;
+}
+
+// Before what is behind it, which may speak of the new configuration.
+void keep_for_later(Owned_Event event, const Vex_Outputs& out) {
+  VEX_put_event_back_at_head(event.release());
+  deliver_no_event(out, 0);
 }
 
 }  // namespace
@@ -149,15 +153,19 @@ Hb_Rc EVMONEventPipeHandler::handler(Hb_Events* events, char* name, Hb_Group* gr
     trace(Trace_Info, trace_event_pipe_queue_empty);
     return deliver_no_event(out, 0);
   }
-  std::unique_ptr<Hb_VEX_Event> event(VEX_get_event_from_head());
+  Hb_Rc rc = Hb_Success;
+  Owned_Event event(VEX_get_event_from_head());
   if (event != nullptr) {
     if (event->type == VEX_Daemon_Up && !revive(event->node_num)) {
       return deliver_no_event(out, 0);
     }
-    deliver(*this, *event, out);
+    rc = deliver(*this, *event, out);
+    if (rc != Hb_Success) {
+      keep_for_later(std::move(event), out);
+    }
     event = nullptr;
   }
-  const Hb_Rc rc = VEX_write_to_event_pipe();
+  const Hb_Rc written = VEX_write_to_event_pipe();
   trace_values(Trace_Info, trace_event_pipe_ends, evmon_fd);
-  return rc;
+  return rc == Hb_Success ? written : rc;
 }

@@ -11,7 +11,8 @@ class EVMONEventPipeHandler : public EVMONHandler {
   ~EVMONEventPipeHandler() override;
 
   // Takes one event from the queue, whether or not a byte waits, and delivers it; then wakes the caller for the next.
-  // A new configuration takes effect here, in the caller's thread.
+  // A new configuration takes effect here, in the caller's thread. Without memory for it the call fails with
+  // HB_EVEXTBL_COPY and delivers nothing; its event is the next one again.
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
   int32_t getWriteFd();
 

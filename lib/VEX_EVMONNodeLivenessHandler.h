@@ -8,7 +8,8 @@
 //   event and joins, of nodes first, behind it.
 // - So is the death of an adapter of the node itself that its return finds up in the table in force alone.
 // - When only a new table is to be told, it takes effect at once. With deaths of others it cannot, as they are named by
-//   the numbers of the table in force: it waits behind them, and the empty event is delivered.
+//   the numbers of the table in force: it waits behind them, and the empty event is delivered. It waits, too, when
+//   there is no memory for it to take effect: the report fails with HB_EVEXTBL_COPY, and its event is queued.
 // - An adapter of the node that is told dead does not come back with the table that was rebuilt for it, whatever the
 //   cluster services say.
 // - A report that is stale, repeated or that cannot be told leaves no table behind; one that waited before it goes on

@@ -48,8 +48,8 @@ enum Hb_Event_Bits {
  * @return `Hb_Success`, or `Hb_Failure` with `HB_EINVAL` (a null pointer; nothing was taken), `HB_ENOTREADY`,
  * `HB_ECOMM`, `HB_EDAEMONGONE`, `HB_EBADREPLY` (a packet that is no event or not whole; it is lost), `HB_ENOMEM`,
  * or in VEX mode `HB_ENOPIPEHANDLER`, `HB_EDISPATCH`, `HB_EMONITOR_READ`, `HB_EVEXTBL_BUILD`, `HB_EVEXTBL_ENTRY`,
- * `HB_EVEXTBL_INTF`, `HB_EVEXGROUP`, or `HB_EEVENTPIPE`: with that one the outputs are an event that was delivered, and
- * only the wake-up for the next one failed. A monitor that cannot be read fails without an error number.
+ * `HB_EVEXTBL_INTF`, `HB_EVEXTBL_COPY`, `HB_EVEXGROUP`, or `HB_EEVENTPIPE`: with that one the outputs are an event that
+ * was delivered, and only the wake-up for the next failed. A monitor that cannot be read fails without an error number.
  */
 HB_API Hb_Rc hb_get_event_message(int* descriptors, struct timeval* timeout, Hb_Events* events, char* name,
                                   Hb_Group* group, Hb_Seq_Num* seqnum_p);

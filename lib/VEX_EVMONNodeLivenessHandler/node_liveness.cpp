@@ -57,10 +57,10 @@ class Node_Change {
   Hb_Rc make_return(Report_Events& events);
   Hb_Rc tell_death(Report_Events& events, bool is_node_death_known);
   Hb_Rc tell_return(Report_Events& events);
-  void deliver_death(Report_Events& events, bool is_node_death_known);
+  Hb_Rc deliver_death(Report_Events& events, bool is_node_death_known);
   void deliver_adapters(Hb_Group& adapters);
   void deliver_node_death();
-  void deliver_new_table();
+  Hb_Rc deliver_new_table(Owned_Event& event);
 
   Hb_Seq_Num number_of_report() const { return static_cast<Hb_Seq_Num>(report_.sequence_number); }
 
@@ -161,27 +161,29 @@ Hb_Rc Node_Change::tell_death(Report_Events& events, bool is_node_death_known) {
   is_told_ = true;
   mark_adapters_down_in_waiting_table(report_.node_number);
   *out_.events = HB_EVENT_DEATH;
-  deliver_death(events, is_node_death_known);
+  const Hb_Rc rc = deliver_death(events, is_node_death_known);
   events.others.append_deaths();
   append_event(std::move(events.configuration));
   events.others.append_joins();
   events.adapters = nullptr;
-  return VEX_write_to_event_pipe();
+  const Hb_Rc written = VEX_write_to_event_pipe();
+  return rc == Hb_Success ? written : rc;
 }
 
 // The death of a node whose group-services daemon was down is known already; its adapters are not.
-void Node_Change::deliver_death(Report_Events& events, bool is_node_death_known) {
+Hb_Rc Node_Change::deliver_death(Report_Events& events, bool is_node_death_known) {
+  if (is_node_death_known && events.adapters == nullptr && !events.others.has_deaths()) {
+    return deliver_new_table(events.configuration);
+  }
   if (events.adapters != nullptr) {
     deliver_adapters(events.adapters->group);
     append_event(std::move(events.node));
   } else if (!is_node_death_known) {
     deliver_node_death();
-  } else if (events.others.has_deaths()) {
-    deliver_no_event(out_, 0);
   } else {
-    deliver_new_table();
-    events.configuration = nullptr;
+    deliver_no_event(out_, 0);
   }
+  return Hb_Success;
 }
 
 void Node_Change::deliver_adapters(Hb_Group& adapters) {
@@ -208,13 +210,19 @@ void Node_Change::deliver_node_death() {
   }
 }
 
-void Node_Change::deliver_new_table() {
-  VEX_copy_and_delete_global_config_tbl();
+// A table that there is no memory for waits for the event.
+Hb_Rc Node_Change::deliver_new_table(Owned_Event& event) {
+  if (put_waiting_table_in_force() != Hb_Success) {
+    deliver_no_event(out_, 0);
+    return Hb_Failure;
+  }
+  event = nullptr;
   old_ = nullptr;
   new_ = nullptr;
   *out_.events = HB_EVENT_CONFIGURATION;
   *out_.seqnum = 0;
   put_name(out_.name, configuration_event_name);
+  return Hb_Success;
 }
 
 Hb_Rc Node_Change::came_up() {

@@ -17,6 +17,9 @@ Hb_Rc hb_vex_update_global_tbl(Hb_Configuration_Internal* cfg_table, zu_evm_even
 // Without memory (HB_EVEXTBL_COPY) both stay.
 void VEX_copy_and_delete_global_config_tbl();
 
+// The same with the table that waits; where none does, the one in force stays. Fails without memory, and it waits on.
+Hb_Rc put_waiting_table_in_force();
+
 // Whether anything was built into the table since it was emptied.
 bool is_table_built(const Hb_Configuration_Internal& table);
 

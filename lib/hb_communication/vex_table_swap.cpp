@@ -63,6 +63,16 @@ void VEX_copy_and_delete_global_config_tbl() {
   index_configuration();
 }
 
+// An event before this one may have put the new table in force.
+Hb_Rc put_waiting_table_in_force() {
+  if (!is_table_built(global_config_tbl_new)) {
+    trace_values(Trace_Info, trace_table_copied, 0);
+    return Hb_Success;
+  }
+  VEX_copy_and_delete_global_config_tbl();
+  return is_table_built(global_config_tbl_new) ? Hb_Failure : Hb_Success;
+}
+
 bool is_table_built(const Hb_Configuration_Internal& table) {
   const bool has_numbers = table.local_node_number != 0 || table.Hb_max_nodes != 0 || table.Hb_num_nodes != 0 ||
                            table.Hb_adapters_per_node != 0 || table.Hb_num_adapters != 0 || table.Hb_num_networks != 0;

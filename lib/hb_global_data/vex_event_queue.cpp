@@ -119,6 +119,14 @@ Hb_VEX_Event* VEX_get_event_from_head() {
   return head;
 }
 
+void VEX_put_event_back_at_head(Hb_VEX_Event* event) {
+  make_mutex_once();
+  HB_MUTEX_SECTION_BEGIN(event_queue_list_and_sequence_mutex)
+  event->next = event_queue_list;
+  event_queue_list = event;
+  HB_MUTEX_SECTION_END(event_queue_list_and_sequence_mutex)
+}
+
 void VEX_display_event_list() {
   make_mutex_once();
   HB_MUTEX_SECTION_BEGIN(event_queue_list_and_sequence_mutex)

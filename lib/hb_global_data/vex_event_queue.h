@@ -37,6 +37,9 @@ void VEX_add_event_at_end(Hb_VEX_Event* _event);
 // The first event, which is the caller's then; null when there is none. Its `next` is stale.
 Hb_VEX_Event* VEX_get_event_from_head();
 
+// Puts one that was taken from there back, with its number.
+void VEX_put_event_back_at_head(Hb_VEX_Event* event);
+
 // Traces what is in the queue.
 void VEX_display_event_list();
 

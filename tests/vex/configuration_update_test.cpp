@@ -475,6 +475,33 @@ TEST_F(ConfigurationUpdate, WithoutMemoryTellsNothingAndFindsTheSameAgain) {
   EXPECT_GE(failures, 13U);  // eight of the table, and five events
 }
 
+TEST_F(ConfigurationUpdate, WithoutMemoryToTakeEffectTellsNothingAndFindsTheSameAgain) {
+  node_comes(5);
+  trace_nothing();
+  size_t failures = 0;
+  for (size_t nth = 1;; ++nth) {
+    set_hb_errno(untouched_number);
+    const long before = live_allocations();
+    Hb_Rc rc = Hb_Success;
+    {
+      const AllocationFailure failure(nth, false);
+      rc = update_with_notification();
+    }
+    if (rc == Hb_Success) break;
+    failures += hb_get_errno() == 70 ? 1U : 0U;
+    EXPECT_TRUE(out.is_untouched()) << nth;
+    EXPECT_THAT(queued(), IsEmpty()) << nth;
+    EXPECT_EQ(waiting_bytes(ends.read()), 0) << nth;
+    EXPECT_EQ(global_config_tbl_new.node_list, nullptr) << nth;
+    EXPECT_EQ(global_num_nodes, 3) << nth;
+    EXPECT_EQ(live_allocations(), before) << nth;
+  }
+  EXPECT_GE(failures, 8U);  // adapters, nodes and for each of three tables its record, its name and its buckets
+  expect_outputs(128, "Hb_Config_Group", untouched);
+  EXPECT_THAT(queued(), ElementsAre("nodes 2: 5", "adapters 2: 240"));
+  EXPECT_NE(find_configured_node(5), nullptr);
+}
+
 // The death of node 3 and its configuration event are queued; memory fails when node 2 has died as well.
 class UpdateWithoutMemory : public ConfigurationUpdate {
  protected:

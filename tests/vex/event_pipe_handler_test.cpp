@@ -4,6 +4,7 @@
 
 #include "VEX_EVMONEventPipeHandler.h"
 #include "handler_state.h"
+#include "support/allocation_faults.h"
 #include "support/process_state.h"
 #include "support/system_calls.h"
 
@@ -383,6 +384,42 @@ TEST_F(EventPipeHandler, BringsTheNewConfigurationIntoForce) {
   ASSERT_EQ(platform_double().traces_of(134).size(), 1U);
   EXPECT_THAT(platform_double().traces_of(134)[0].values, ElementsAre(2U, 9U, 0U, 1U, 3U, 0U));
   EXPECT_EQ(platform_double().traces_of(121)[0].block_text(0), "Event pipe handler: after copy");
+}
+
+// An event before this one has brought the table into force.
+TEST_F(EventPipeHandler, LeavesTheConfigurationInForceWhereNoneWaits) {
+  const Hb_Node_config_state* in_force = global_config_tbl.node_list;
+  Hb_VEX_Event* event = nullptr;
+  event_pipe_handler_p->constructConfigEvent(&event);
+  VEX_add_event_at_end(event);
+  EXPECT_EQ(serve(), Hb_Success);
+  EXPECT_EQ(out.events, 128);
+  EXPECT_STREQ(out.name, "Hb_Config_Group");
+  EXPECT_EQ(global_config_tbl.node_list, in_force);
+  EXPECT_EQ(global_config_tbl.Hb_max_nodes, 4);
+  EXPECT_THAT(trace_lines(), IsSupersetOf({"Info 131", "Info 132: 0", "Info 121"}));
+}
+
+// It would be lost otherwise: the queue is the only one that knows of it.
+TEST_F(EventPipeHandler, KeepsAConfigurationEventForWhichThereIsNoMemory) {
+  platform_double().set_levels({0, 0, 0});
+  fill_table(global_config_tbl_new, 9, 3, {{1}, {4}}, {});
+  queue(Hb_Node_Group, 128);
+  queue(Hb_Node_Group, 2);
+  {
+    const AllocationFailure failure(1);
+    EXPECT_EQ(serve(), Hb_Failure);
+    EXPECT_TRUE(failure.happened());
+  }
+  EXPECT_EQ(hb_get_errno(), 70);
+  EXPECT_TRUE(out.is_empty_event());
+  EXPECT_EQ(global_config_tbl.Hb_max_nodes, 4);
+  EXPECT_EQ(waiting_bytes(ends.read()), 1);
+  EXPECT_EQ(serve(), Hb_Success);
+  EXPECT_EQ(out.events, 128);
+  EXPECT_EQ(global_config_tbl.Hb_max_nodes, 9);
+  EXPECT_EQ(serve(), Hb_Success);
+  EXPECT_EQ(out.events, 2);
 }
 
 TEST_F(EventPipeHandler, NamesAConfigurationEventWhateverItsGroup) {

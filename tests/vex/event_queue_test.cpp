@@ -38,6 +38,18 @@ TEST_F(EventQueue, NumbersEventsFromZeroAndGivesThemOutInTheirOrder) {
   EXPECT_EQ(VEX_event_queue_is_empty(), Hb_True);
 }
 
+TEST_F(EventQueue, GivesAnEventThatWasPutBackOutFirstAndWithItsNumber) {
+  queue(Hb_Node_Group, 1);
+  const Hb_VEX_Event* second = queue(Hb_Node_Group, 2);
+  Hb_VEX_Event* first = take().release();
+  VEX_put_event_back_at_head(first);
+  const std::unique_ptr<Hb_VEX_Event> again = take();
+  EXPECT_EQ(again.get(), first);
+  EXPECT_EQ(again->sequence_num, 0);
+  EXPECT_EQ(take().get(), second);
+  EXPECT_EQ(event_sequence, 2);
+}
+
 TEST_F(EventQueue, GoesOnCountingWhenEventsWereTaken) {
   queue(Hb_Node_Group, 1);
   take();

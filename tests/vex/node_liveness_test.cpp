@@ -712,6 +712,32 @@ TEST_P(NodeLivenessMemory, ThatRunsOutTellsNothingAndLeavesEverythingAsItWas) {
 
 INSTANTIATE_TEST_SUITE_P(DeathAndReturn, NodeLivenessMemory, testing::Values(ZU_EVM_EVENT_DOWN, ZU_EVM_EVENT_UP));
 
+TEST_F(NodeLiveness, WithoutMemoryForATableThatIsToldAloneFailsAndTheTableWaitsForItsEvent) {
+  Monitored_Client::subscribe();
+  Monitored_Client::trace_nothing();
+  Monitored_Client::mark(3, Hb_Entity_Down, Hb_Entity_State_Reason_BRIXD_Down);
+  Monitored_Client::goes_down(3);
+  Hb_Rc rc = Hb_Success;
+  for (size_t nth = 1; hb_get_errno() != 70; ++nth) {
+    ASSERT_GT(100U, nth);
+    ASSERT_EQ(0, global_config_tbl_new.Hb_num_nodes) << nth;
+    {
+      const LeakAllowed lists_stay;
+      scripted_cluster().notify(descriptor(), zu_evm_event_node_liveness_t{ZU_EVM_EVENT_DOWN, 3, 1, 2, 3, {}});
+      const AllocationFailure failure(nth, false);
+      rc = monitor.handler(&out.events, out.name, out.group.get(), &out.sequence);
+    }
+  }
+  EXPECT_EQ(Hb_Failure, rc);
+  EXPECT_EQ(0, out.events);
+  EXPECT_EQ("<EMPTY EVENT>", name());
+  EXPECT_THAT(Monitored_Client::state_of(3), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_BRIXD_Down));
+  EXPECT_THAT(Monitored_Client::queue(), ElementsAre(configuration_event));
+  EXPECT_EQ(1, client.bytes_in_pipe());
+  Monitored_Client::take_configuration();
+  EXPECT_THAT(Monitored_Client::state_of(3), Pair(Hb_Entity_Down, Hb_Entity_State_Reason_Down));
+}
+
 // Numbers beyond what a cluster has.
 
 class StrangeNodes : public NodeLiveness, public testing::WithParamInterface<uint32_t> {};
