@@ -154,22 +154,24 @@ void bring_adapters_up(zu_int32_t node, const zu_vex_net_intf_info_t* interfaces
   }
 }
 
-Hb_Rc construct_adapter_join(zu_int32_t node, Adapter_Event& event) {
+// The interfaces of the cluster, asked for the adapters of a node that joins. An empty list is null, too.
+bool query_joining_interfaces(zu_vex_net_intf_info_t*& list) {
   if (evmon_cluster_name == nullptr) {
     trace(Trace_Info, trace_join_without_cluster_name);
   }
-  zu_vex_net_intf_info_t* list = nullptr;
   const int result = zu_vex_get_net_intf_info(&list);
   if (result != 0) {
     set_hb_errno(HB_EVEXTBL_INTF);
     trace_values(Trace_Info, trace_join_adapters_failed, result, errno, HB_EVEXTBL_INTF);
+  }
+  return result == 0;
+}
+
+Hb_Rc take_adapters_up(zu_int32_t node, Adapter_Event& event, const zu_vex_net_intf_info_t* interfaces) {
+  if (name_joining_adapters(node, event, interfaces) != Hb_Success) {
     return Hb_Failure;
   }
-  const Interface_List interfaces(list);
-  if (name_joining_adapters(node, event, interfaces.get()) != Hb_Success) {
-    return Hb_Failure;
-  }
-  bring_adapters_up(node, interfaces.get());
+  bring_adapters_up(node, interfaces);
   return Hb_Success;
 }
 
@@ -216,7 +218,11 @@ Hb_Rc EVMONHandler::constructAdapterEventOnNode(zu_int32_t _node, Hb_VEX_Event**
   if (_evtType == HB_EVENT_DEATH) {
     rc = take_adapters_down(_node, event);
   } else if (_evtType == HB_EVENT_JOIN) {
-    rc = construct_adapter_join(_node, event);
+    zu_vex_net_intf_info_t* list = nullptr;
+    if (!query_joining_interfaces(list)) {
+      return Hb_Failure;
+    }
+    rc = take_adapters_up(_node, event, Interface_List(list).get());
   }
   finish(_evt != nullptr ? *_evt : nullptr, _evtType, event.count());
   return rc;
