@@ -16,12 +16,12 @@ EVMONNodeListHandler::EVMONNodeListHandler(char* path) : EVMONConfigurationHandl
 
 Hb_Rc EVMONNodeListHandler::handler(Hb_Events* events, char* /*name*/, Hb_Group* /*group*/, Hb_Seq_Num* /*seqnum_p*/) {
   trace_values(Trace_Info, trace_node_list_begins, evmon_fd);
-  const Hb_Rc rc = read_and_trace(*events);
+  const Hb_Rc rc = read_and_trace(events);
   trace_values(Trace_Info, trace_node_list_ends, evmon_fd);
   return rc;
 }
 
-Hb_Rc EVMONNodeListHandler::read_and_trace(Hb_Events& events) {
+Hb_Rc EVMONNodeListHandler::read_and_trace(Hb_Events* events) {
   zu_evm_event_node_list_t* record = nullptr;
   const int read_result = zu_evm_read_node_list(evmon_fd, &record);
   if (read_result != ZU_EVM_RECORD || record == nullptr) {

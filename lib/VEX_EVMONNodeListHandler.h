@@ -14,5 +14,5 @@ class EVMONNodeListHandler : public EVMONConfigurationHandler {
   Hb_Rc handler(Hb_Events* events, char* name, Hb_Group* group, Hb_Seq_Num* seqnum_p) override;
 
  private:
-  Hb_Rc read_and_trace(Hb_Events& events);
+  Hb_Rc read_and_trace(Hb_Events* events);
 };

@@ -23,5 +23,5 @@ Hb_Rc EVMONPeerGSLivenessHandler::handler(Hb_Events* events, char* /*name*/, Hb_
   }
   const Monitor_Record<zu_evm_event_process_liveness_t> notification(record);
   trace_notification(*notification);
-  return without_event(*events);
+  return without_event(events);
 }

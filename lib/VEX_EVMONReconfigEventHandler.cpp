@@ -23,5 +23,5 @@ Hb_Rc EVMONReconfigEventHandler::handler(Hb_Events* events, char* /*name*/, Hb_G
   }
   const Monitor_Record<zu_evm_event_cluster_reconfig_t> notification(record);
   trace_notification(*notification);
-  return without_event(*events);
+  return without_event(events);
 }

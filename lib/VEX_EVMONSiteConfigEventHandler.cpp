@@ -29,12 +29,12 @@ EVMONSiteConfigEventHandler::EVMONSiteConfigEventHandler(char* path)
 Hb_Rc EVMONSiteConfigEventHandler::handler(Hb_Events* events, char* /*name*/, Hb_Group* /*group*/,
                                            Hb_Seq_Num* /*seqnum_p*/) {
   trace_values(Trace_Info, trace_site_config_begins, evmon_fd);
-  const Hb_Rc rc = read_and_learn(*events);
+  const Hb_Rc rc = read_and_learn(events);
   trace_values(Trace_Info, trace_site_config_ends, evmon_fd);
   return rc;
 }
 
-Hb_Rc EVMONSiteConfigEventHandler::read_and_learn(Hb_Events& events) {
+Hb_Rc EVMONSiteConfigEventHandler::read_and_learn(Hb_Events* events) {
   zu_evm_event_site_cfg_t* record = nullptr;
   const int read_result = zu_evm_read_site_cfg(evmon_fd, &record);
   if (read_result == ZU_EVM_NOTHING) {

@@ -21,7 +21,7 @@ class EVMONSiteConfigEventHandler : public EVMONConfigurationHandler {
   bool cached_site_merge_policy_obtained;
 
  private:
-  Hb_Rc read_and_learn(Hb_Events& events);
+  Hb_Rc read_and_learn(Hb_Events* events);
   void learn(const zu_evm_event_site_cfg_t& record);
   void learn_site(const zu_evm_event_site_cfg_t& record);
 };

@@ -19,8 +19,8 @@ inline Hb_Rc monitor_cannot_be_read(Trace_Record record, int read_result, int de
 }
 
 // Nothing that the caller has to know of; the other outputs stay as they are.
-inline Hb_Rc without_event(Hb_Events& events) {
-  events = HB_EVENT_NONE;
+inline Hb_Rc without_event(Hb_Events* events) {
+  *events = HB_EVENT_NONE;
   return Hb_Success;
 }
 

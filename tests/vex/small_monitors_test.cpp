@@ -250,6 +250,11 @@ TEST_P(SmallMonitors, AreArmedWithNothing) {
   EXPECT_EQ("", std::string(opened.init_string.c_str()));
 }
 
+TEST_P(SmallMonitors, ThatCannotBeReadNeedNoOutputs) {
+  scripted_cluster().notify_result(descriptor(), -1, ENXIO);
+  EXPECT_EQ(Hb_Failure, monitor->handler(nullptr, nullptr, nullptr, nullptr));
+}
+
 INSTANTIATE_TEST_SUITE_P(All, SmallMonitors, testing::ValuesIn(small_monitors),
                          [](const auto& parameter) { return std::string(parameter.param.name); });
 
