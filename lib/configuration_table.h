@@ -29,8 +29,8 @@ struct Hb_Configuration_Internal {
 
 // Adapter numbers of a cluster are below this; 0 before a configuration is loaded.
 inline Hb_Adapter_Number adapter_number_limit(const Hb_Configuration_Internal& table) {
-  return static_cast<Hb_Adapter_Number>(table.Hb_adapters_per_node) *
-         static_cast<Hb_Adapter_Number>(table.Hb_max_nodes);
+  return static_cast<Hb_Adapter_Number>(std::max(table.Hb_adapters_per_node, 0)) *
+         static_cast<Hb_Adapter_Number>(std::max(table.Hb_max_nodes, 0));
 }
 
 // How many records the adapter list holds; none while there is no list.

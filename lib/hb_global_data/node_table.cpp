@@ -1,5 +1,7 @@
 #include "hb_global_data/node_table.h"
 
+#include <algorithm>
+
 #include "hb_communication/configuration_parts.h"
 #include "hb_global_data/record_index.h"
 
@@ -20,7 +22,7 @@ void index_configuration() {
 namespace {
 
 bool has_configured_adapter(int node) {
-  const auto slots = static_cast<Hb_Adapter_Number>(global_config_tbl.Hb_adapters_per_node);
+  const auto slots = static_cast<Hb_Adapter_Number>(std::max(global_config_tbl.Hb_adapters_per_node, 0));
   const Hb_Adapter_Number first = static_cast<Hb_Adapter_Number>(node) * slots;
   for (Hb_Adapter_Number slot = 0; slot < slots; ++slot) {
     if (find_configured_adapter(first + slot) != nullptr) {

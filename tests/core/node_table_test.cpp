@@ -89,6 +89,13 @@ TEST_F(NodeTable, WithoutAdaptersPerNodeHoldsNobody) {
   EXPECT_TRUE(present_nodes().empty());
 }
 
+TEST_F(NodeTable, WithFewerThanNoAdaptersPerNodeHoldsNobody) {
+  configure(3, -1, {0, 1});
+  hb_init_global_node_tbl();
+  EXPECT_TRUE(present_nodes().empty());
+  EXPECT_EQ(global_num_nodes, 0);
+}
+
 TEST_F(NodeTable, ReachesTheLastNodeOfTheLargestCluster) {
   configure(2049, 48, {98351});
   hb_init_global_node_tbl();

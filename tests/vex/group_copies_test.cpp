@@ -37,6 +37,18 @@ class GroupCopies : public HandlerState {
     expected->Hb_events = source->Hb_events;
   }
 
+  // The group, and so many entries of its list.
+  void expect_adapters_copied(int entries) {
+    copy(&EVMONHandler::copy_adapter_Hb_Group);
+    expect_heading();
+    Hb_Adapter_Membership_Grp& membership = expected->Hb_membership_grp_union.Hb_adapter_membership_grp;
+    membership.Hb_group_incarnation = 0x33333333;
+    membership.Hb_group_leader = 0x33333333;
+    membership.Hb_num_adapters = 0x33333333;
+    std::fill_n(membership.Hb_adapter_list, entries, 0x33333333U);
+    EXPECT_TRUE(same_bytes(*destination, *expected));
+  }
+
   Copying_Handler handler;
   std::unique_ptr<Hb_Group> source = group_of_bytes(0x33);
   std::unique_ptr<Hb_Group> destination = group_of_bytes(0x5A);
@@ -45,16 +57,7 @@ class GroupCopies : public HandlerState {
 
 TEST_F(GroupCopies, OfAdaptersTakeTheEntriesOfTheConfigurationAndNoMore) {
   fill_table(global_config_tbl, 3, 2, {}, {});
-  copy(&EVMONHandler::copy_adapter_Hb_Group);
-  expect_heading();
-  Hb_Adapter_Membership_Grp& membership = expected->Hb_membership_grp_union.Hb_adapter_membership_grp;
-  membership.Hb_group_incarnation = 0x33333333;
-  membership.Hb_group_leader = 0x33333333;
-  membership.Hb_num_adapters = 0x33333333;
-  for (int adapter = 0; adapter < 6; ++adapter) {
-    membership.Hb_adapter_list[adapter] = 0x33333333;
-  }
-  EXPECT_TRUE(same_bytes(*destination, *expected));
+  expect_adapters_copied(6);
   EXPECT_THAT(trace_lines(), IsEmpty());
 }
 
@@ -66,6 +69,12 @@ TEST_F(GroupCopies, OfAdaptersStayInTheRecordWhateverTheConfigurationSays) {
   Hb_Adapter_Membership_Grp& membership = expected->Hb_membership_grp_union.Hb_adapter_membership_grp;
   std::memset(&membership, 0x33, sizeof membership);
   EXPECT_TRUE(same_bytes(*destination, *expected));
+}
+
+TEST_F(GroupCopies, OfAdaptersTakeNoEntriesOfAConfigurationBelowZero) {
+  global_config_tbl.Hb_max_nodes = -1;
+  global_config_tbl.Hb_adapters_per_node = 3;
+  expect_adapters_copied(0);
 }
 
 TEST_F(GroupCopies, OfNodesTakeAllEntries) {
