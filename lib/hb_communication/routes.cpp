@@ -23,13 +23,19 @@ int int_compare(const void* first, const void* second) {
 
 namespace {
 
+// The header may say another number since the segment was attached. It answers for routes that a program has put in the
+// segment's place.
+uint32_t published_routes() {
+  return shared_route_info == attached_routes ? attached_route_count : data_for_client->number_of_nodes;
+}
+
 // Copies what is published for the node, which is current only while its number is that of the configuration.
 bool copy_published_route(Hb_Node_Number node, route_sequence& route) {
   if (data_for_client == nullptr || shared_route_info == nullptr) {
     return false;
   }
   const Reader_Hold hold;
-  if (static_cast<uint32_t>(node) >= shared_route_count) {
+  if (static_cast<uint32_t>(node) >= published_routes()) {
     return false;
   }
   std::memcpy(&route, &shared_route_info[node], sizeof route);

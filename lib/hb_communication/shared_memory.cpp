@@ -116,11 +116,14 @@ Hb_Rc hb_init_shared_memory() {
   }
   const uint32_t routes = data_for_client->number_of_nodes;
   const size_t route_size = size_t{routes} * sizeof *shared_route_info;
-  if (attach(keys.route, route_size, other_get_errors, shm_id[1], shared_route_info) != Hb_Success ||
-      attach(keys.security, sizeof *security_info, other_get_errors, shm_id[2], security_info) != Hb_Success) {
+  if (attach(keys.route, route_size, other_get_errors, shm_id[1], shared_route_info) != Hb_Success) {
     return Hb_Failure;
   }
-  shared_route_count = routes;
+  attached_routes = shared_route_info;
+  attached_route_count = routes;
+  if (attach(keys.security, sizeof *security_info, other_get_errors, shm_id[2], security_info) != Hb_Success) {
+    return Hb_Failure;
+  }
   shm_sem_id = semget(keys.semaphores, HB_SEMAPHORE_COUNT, 0);
   return shm_sem_id != -1 ? Hb_Success : fail_by_errno(semaphore_errors, HB_ESEMGET);
 }
@@ -131,6 +134,7 @@ void hb_detach_shared_memory() {
   detach(security_info);
   data_for_client = nullptr;
   shared_route_info = nullptr;
-  shared_route_count = 0;
+  attached_routes = nullptr;
+  attached_route_count = 0;
   security_info = nullptr;
 }

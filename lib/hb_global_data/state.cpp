@@ -25,7 +25,8 @@ Hb_Adapter HB_INVALID_ADAP = {all_ones_address(), HB_NO_NETWORK, "un", HB_NO_ADA
 
 Hb_memory_configuration_data* data_for_client = nullptr;
 Hb_route_sequence* shared_route_info = nullptr;
-uint32_t shared_route_count = 0;
+const Hb_route_sequence* attached_routes = nullptr;
+uint32_t attached_route_count = 0;
 Hb_security_information* security_info = nullptr;
 int shm_id[3] = {};
 int shm_sem_id = 0;

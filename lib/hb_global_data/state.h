@@ -37,7 +37,8 @@ extern Hb_Adapter HB_INVALID_ADAP;  // what an unknown adapter is looked up as; 
 
 extern Hb_memory_configuration_data* data_for_client;
 extern Hb_route_sequence* shared_route_info;
-extern uint32_t shared_route_count;  // entries of the route segment as it was attached
+extern const Hb_route_sequence* attached_routes;  // the route segment as it was attached, and its entries
+extern uint32_t attached_route_count;
 extern Hb_security_information* security_info;
 extern int shm_id[3];
 extern int shm_sem_id;

@@ -415,6 +415,35 @@ TEST_P(RouteOfAShortSegment, IsNoneBeyondTheSegmentWhateverTheDaemonCountsNow) {
 
 INSTANTIATE_TEST_SUITE_P(Routes, RouteOfAShortSegment, testing::ValuesIn(reads), name_of_read);
 
+// What a program has put in the place of the two segments.
+class RouteOfTheProgram : public PublishedRoute {
+ protected:
+  RouteOfTheProgram() : attached_header(data_for_client), attached_routes_segment(shared_route_info) {
+    data_for_client = &header;
+    shared_route_info = routes;
+    routes[2] = {7, 9, 0, {}};
+    routes[3] = {7, 9, 0, {}};
+  }
+  ~RouteOfTheProgram() override {
+    data_for_client = attached_header;
+    shared_route_info = attached_routes_segment;
+  }
+
+  Hb_memory_configuration_data header = {.sequence_number = 7, .number_of_nodes = 3, .number_of_adapters = 0};
+  Hb_route_sequence routes[8] = {};
+  Hb_memory_configuration_data* attached_header;
+  Hb_route_sequence* attached_routes_segment;
+};
+
+TEST_P(RouteOfTheProgram, IsReadUpToTheNumberOfItsHeader) {
+  EXPECT_TRUE(is_read(2));
+  EXPECT_EQ(9, out.length);
+  out = Route_Outputs();
+  EXPECT_TRUE(is_refused_with(6, 3));
+}
+
+INSTANTIATE_TEST_SUITE_P(Routes, RouteOfTheProgram, testing::ValuesIn(reads), name_of_read);
+
 // Routes that are no IP routes.
 
 TEST_F(Routes, ThatAreNoIpRoutesAreReadAsSuchOnly) {
