@@ -103,3 +103,12 @@ inline Trace_Block block_of_text(const char* text) {
   const char* shown = text != nullptr ? text : "";
   return {shown, static_cast<uint32_t>(std::strlen(shown) + 1)};
 }
+
+// The same of a text of at most so many characters; one that has as many stands without a terminator.
+inline Trace_Block block_of_name(const char* name, size_t longest) {
+  if (name == nullptr) {
+    return {"", 1};
+  }
+  const size_t length = strnlen(name, longest);
+  return {name, static_cast<uint32_t>(length < longest ? length + 1 : length)};
+}

@@ -32,11 +32,6 @@ void copy_text(char* to, const char (&from)[N]) {
   to[length] = '\0';
 }
 
-template <size_t N>
-uint32_t text_length(const char (&text)[N]) {
-  return static_cast<uint32_t>(strnlen(text, N));
-}
-
 // The common part of all walkers: the first position that qualifies, from the start or the cursor up to the bound.
 template <typename Item, typename Qualifies, typename Item_At>
 Hb_Rc walk(Item* item, Hb_Cursor* cursor, int trans, int bound, Item none, Qualifies qualifies, Item_At item_at) {
@@ -115,7 +110,7 @@ Hb_Rc process_site_number_list(Hb_Site_Number* site, Hb_Cursor* cursor, int tran
 [[gnu::cold, gnu::noinline]] void trace_address(Hb_IP_address6* address, Hb_Adapter_Number adapter) {
   char text[INET6_ADDRSTRLEN];
   mowllib_ntop(address, text);
-  trace_data(Trace_Info, trace_address_of_adapter, {{text, text_length(text)}, {&adapter, sizeof adapter}});
+  trace_data(Trace_Info, trace_address_of_adapter, {block_of_text(text), block_of(adapter)});
 }
 
 Hb_Rc get_number(int value, int* number) {
@@ -229,7 +224,7 @@ Hb_Rc hb_get_adapter_type_by_number(Hb_Adapter_Number adapter, char* adapter_typ
   }
   copy_text(adapter_type, record->Hb_adapter_type);
   trace_data(Trace_Info, trace_type_of_adapter,
-             {{record->Hb_adapter_type, text_length(record->Hb_adapter_type)}, {&adapter, sizeof adapter}});
+             {block_of_name(record->Hb_adapter_type, sizeof record->Hb_adapter_type), block_of(adapter)});
   return Hb_Success;
 }
 

@@ -53,12 +53,4 @@ Hb_Rc cannot_be_read(Trace_Record record, Values... values) {
   return Hb_Failure;
 }
 
-inline Trace_Block block_of_name(const char* name, size_t longest) {
-  if (name == nullptr) {
-    return {"", 1};
-  }
-  const size_t length = strnlen(name, longest);
-  return {name, static_cast<uint32_t>(length < longest ? length + 1 : length)};
-}
-
 inline Trace_Block block_of_interface(const char* name) { return block_of_name(name, interface_name_length); }

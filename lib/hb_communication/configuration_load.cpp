@@ -49,12 +49,9 @@ void trace_repeated_address(Hb_Adapter& adapter) {
   }
   char address[INET6_ADDRSTRLEN];
   mowllib_ntop(&adapter.Hb_ip_address, address);
-  const auto text_length = [](const char* text, size_t size) { return static_cast<uint32_t>(strnlen(text, size)); };
   trace_data(Trace_Info, trace_adapter_address_repeated,
-             {{address, text_length(address, sizeof address)},
-              {adapter.Hb_adapter_type, text_length(adapter.Hb_adapter_type, sizeof adapter.Hb_adapter_type)},
-              {&adapter.Hb_adapter_num, sizeof adapter.Hb_adapter_num},
-              {&adapter.Hb_state, sizeof adapter.Hb_state}});
+             {block_of_text(address), block_of_name(adapter.Hb_adapter_type, sizeof adapter.Hb_adapter_type),
+              block_of(adapter.Hb_adapter_num), block_of(adapter.Hb_state)});
 }
 
 void add_address(Configuration_Parts& tables, Hb_Adapter& adapter) {

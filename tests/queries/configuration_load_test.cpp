@@ -358,6 +358,8 @@ TEST_F(TracedLoad, ARepeatedAddressIsTracedBehindItsAdapter) {
   ASSERT_EQ(4U, trace.blocks.size());
   EXPECT_EQ("10.0.1.3", trace.block_text(0));
   EXPECT_EQ("en0", trace.block_text(1));
+  EXPECT_EQ(9U, trace.blocks[0].size());  // texts stand with their terminators
+  EXPECT_EQ(4U, trace.blocks[1].size());
   EXPECT_EQ(2U, trace.block_value(2));
   EXPECT_EQ(2U, trace.block_value(3));
 }

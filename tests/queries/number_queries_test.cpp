@@ -304,6 +304,7 @@ TEST_F(ConfigurationQueries, TheAddressOfAnAdapterIsTracedAsText) {
   EXPECT_EQ(1, trace.category);
   ASSERT_EQ(2U, trace.blocks.size());
   EXPECT_EQ("10.0.1.3", trace.block_text(0));
+  EXPECT_EQ(9U, trace.blocks[0].size());  // the text stands with its terminator
   EXPECT_EQ(13U, trace.block_value(1));
 }
 
@@ -318,6 +319,7 @@ TEST_F(ConfigurationQueries, TheTypeOfAnAdapterIsTraced) {
   EXPECT_EQ(1, trace.category);
   ASSERT_EQ(2U, trace.blocks.size());
   EXPECT_EQ("disk2", trace.block_text(0));
+  EXPECT_EQ(6U, trace.blocks[0].size());
   EXPECT_EQ(2U, trace.block_value(1));
 }
 
