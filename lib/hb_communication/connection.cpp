@@ -70,24 +70,34 @@ const char* non_empty_variable(const char* name) {
   return value != nullptr && *value != '\0' ? value : nullptr;
 }
 
-// Sets SERVER_SOCK_FNAME from the environment; false, with both paths as they were, when no socket address holds it.
-bool resolve_socket_path() {
+// False, with the path as it was, when no socket address holds the variable's value.
+bool resolve_base_path() {
   const char* base = std::getenv(HB_SERVER_SOCKET_VARIABLE);
   if (base == nullptr) {
-    base = HB_SERVER_SOCKET;
+    return true;
+  }
+  const size_t size = std::strlen(base) + 1;
+  if (size > sizeof HB_SERVER_SOCKET) {
+    return false;
+  }
+  std::memcpy(HB_SERVER_SOCKET, base, size);
+  return true;
+}
+
+// Sets SERVER_SOCK_FNAME from the environment; false, with that path as it was, when no socket address holds it.
+bool resolve_socket_path() {
+  if (!resolve_base_path()) {
+    return false;
   }
   const char* suffix = non_empty_variable(HB_DOMAIN_VARIABLE);
   if (suffix == nullptr) {
     suffix = non_empty_variable(HB_PARTITION_VARIABLE);
   }
   char path[HB_SOCKET_PATH_SIZE];
-  const int length = suffix != nullptr ? std::snprintf(path, sizeof path, "%s.%s", base, suffix)
-                                       : std::snprintf(path, sizeof path, "%s", base);
+  const int length = suffix != nullptr ? std::snprintf(path, sizeof path, "%s.%s", HB_SERVER_SOCKET, suffix)
+                                       : std::snprintf(path, sizeof path, "%s", HB_SERVER_SOCKET);
   if (length < 0 || static_cast<size_t>(length) >= sizeof path) {
     return false;
-  }
-  if (base != HB_SERVER_SOCKET) {
-    std::memcpy(HB_SERVER_SOCKET, base, std::strlen(base) + 1);
   }
   std::memcpy(SERVER_SOCK_FNAME, path, sizeof path);
   return true;

@@ -111,6 +111,18 @@ TEST(BasePath, StaysWhenTheVariableIsGone) {
   EXPECT_STREQ(SERVER_SOCK_FNAME, "/tmp/once.d1");
 }
 
+TEST(BasePath, IsTakenWhereThePathWithTheDomainIsTooLong) {
+  reset_platform();
+  set_base_path("/tmp/once");
+  const std::string base(100, 'x');
+  setenv("HB_SERVER_SOCKET", base.c_str(), 1);
+  setenv("HA_DOMAIN_NAME", "domains", 1);
+  unsetenv("HA_SYSPAR_NAME");
+  EXPECT_EQ(hb_init_communication(), Hb_Failure);
+  EXPECT_EQ(hb_get_errno(), 15);
+  EXPECT_EQ(HB_SERVER_SOCKET, base);
+}
+
 class TooLongPath : public testing::TestWithParam<Path_Case> {};
 
 TEST_P(TooLongPath, IsNotConnectedTo) {
