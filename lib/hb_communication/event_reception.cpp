@@ -256,11 +256,11 @@ Hb_Rc hb_get_event_message(int* descriptors, timeval* timeout, Hb_Events* events
       return stop_without_event_pipe();
     }
   }
+  if (descriptors != nullptr && descriptors[0] == -1) {
+    return Hb_Failure;
+  }
   if (descriptors == nullptr || events == nullptr || name == nullptr || group == nullptr || seqnum_p == nullptr) {
     return fail(HB_EINVAL);
-  }
-  if (descriptors[0] == -1) {
-    return Hb_Failure;
   }
   const Outputs out = {events, name, group};
   return vex_mode ? get_vex_event(descriptors, out, seqnum_p) : get_daemon_event(timeout, out, seqnum_p);

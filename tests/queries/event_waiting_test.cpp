@@ -116,6 +116,12 @@ TEST_F(EventReception, AnEmptyDescriptorArrayFailsWithoutAnErrorNumberAndTakesNo
   EXPECT_EQ(Hb_Success, take());
 }
 
+TEST_F(EventReception, AnEmptyDescriptorArrayIsSeenBeforeTheOutputs) {
+  descriptors[0] = -1;
+  EXPECT_TRUE(fails_without_error_number(
+      [&] { return hb_get_event_message(descriptors, nullptr, nullptr, nullptr, nullptr, nullptr); }));
+}
+
 TEST_F(EventReception, TheDescriptorArrayOfTheLibraryServesToTakeEvents) {
   int* array = nullptr;
   int count = 0;
