@@ -17,10 +17,13 @@ void cpp_malloc(void** p, int size, const char* /*tag*/) {
     *p = nullptr;
     return;
   }
-  char* block = new char[static_cast<size_t>(size)];
+  // Read back, as compilers take it that no allocator yields null; one that a program has put in its place may.
+  char* volatile block = new char[static_cast<size_t>(size)];
   *p = block;
-  ++memchunks;
-  mowl_pin_new_data(block, static_cast<size_t>(size));
+  if (*p != nullptr) {
+    ++memchunks;
+    mowl_pin_new_data(*p, static_cast<size_t>(size));
+  }
 }
 
 void ccst_free(void* ptr) {
