@@ -9,6 +9,7 @@
 namespace bench {
 
 Directory::Directory() {
+  // mkdtemp() puts a name of its own in the place of the six letters.
   std::string name = (std::filesystem::temp_directory_path() / "hb_bench.XXXXXX").string();
   if (mkdtemp(name.data()) == nullptr) throw_errno("mkdtemp " + name);
   path_ = name;

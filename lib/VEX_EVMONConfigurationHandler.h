@@ -7,9 +7,9 @@
 // - When only nodes died, no death is delivered at once, and the caller gets the empty event.
 // - When an older new table still waits for its configuration event, this one waits in its place, and who is up again
 //   since is told as well: the death is in the queue, and the table in force does not know of it.
-// - Without memory for one of the events, or for the new table to take effect at once, nothing is told, the table in
-// force stays, and so does an older new table that
-//   waits for its configuration event: the next notification finds the same differences again.
+// - Without memory for one of the events, or for the new table to take effect at once, nothing is told. The table in
+//   force stays, and so does an older new table that waits for its configuration event: the next notification finds the
+//   same differences again.
 #pragma once
 
 #include "VEX_EVMONHandler.h"

@@ -2,9 +2,8 @@
 //
 // What the interface leaves open:
 // - Every monitor is needed. Where the first one that is opened says that there are none here (-1), the platform has no
-// monitors, and
-//   nothing is made; but where a monitor is open, there are some, and the others are missed. Whatever keeps a handler
-//   from being made, the whole set goes.
+//   monitors, and nothing is made; but where a monitor is open, there are some, and the others are missed. Whatever
+//   keeps a handler from being made, the whole set goes.
 // - A handler that is there already stays the one of its kind, so that creating the set again adds what is missing.
 // - A cluster that does not tell its name has none; memory that the name does not fit in is a failure.
 // - Nobody waits for room in a pipe: writing into a full one fails. Of the new-group pipe the read end waits, as its

@@ -12,6 +12,7 @@
 class TemporaryDirectory {
  public:
   TemporaryDirectory() {
+    // mkdtemp() puts a name of its own in the place of the six letters.
     std::string name = "/tmp/hb_test.XXXXXX";
     if (mkdtemp(name.data()) == nullptr) {
       throw std::system_error(errno, std::generic_category(), "making the directory " + name);

@@ -30,6 +30,13 @@ class EventPipe : public EventQueue {
     start_tracing();
   }
 
+  void write_where_nobody_reads() {
+    make_pipe(1);
+    close(ends.read());
+    EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Failure);
+    EXPECT_EQ(errno, EPIPE);
+  }
+
   static void block(int signal) {
     sigset_t signals;
     sigemptyset(&signals);
@@ -182,10 +189,7 @@ TEST_F(EventPipe, FailsWhenItsWriteEndWasClosedBehindTheLibrary) {
 // Nobody reads, and nobody is killed for it: the program's handling of the signal is its own.
 TEST_F(EventPipe, FailsWithoutASignalWhenItsReadEndWasClosed) {
   std::signal(SIGPIPE, SIG_DFL);
-  make_pipe(1);
-  close(ends.read());
-  EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Failure);
-  EXPECT_EQ(errno, EPIPE);
+  write_where_nobody_reads();
   EXPECT_EQ(hb_get_errno(), 59);
   EXPECT_THAT(trace_lines(), ElementsAre("Info 58: -1 32"));
   EXPECT_FALSE(waits(SIGPIPE));
@@ -198,10 +202,7 @@ TEST_F(EventPipe, FailsWithoutASignalWhenItsReadEndWasClosed) {
 TEST_F(EventPipe, CallsNoSignalHandlerWhenItsReadEndWasClosed) {
   static volatile std::sig_atomic_t calls = 0;
   std::signal(SIGPIPE, [](int) { calls = calls + 1; });
-  make_pipe(1);
-  close(ends.read());
-  EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Failure);
-  EXPECT_EQ(errno, EPIPE);
+  write_where_nobody_reads();
   EXPECT_EQ(calls, 0);
   raise(SIGPIPE);
   EXPECT_EQ(calls, 1);
@@ -209,10 +210,7 @@ TEST_F(EventPipe, CallsNoSignalHandlerWhenItsReadEndWasClosed) {
 
 TEST_F(EventPipe, LeavesNoSignalToAProgramThatHasItBlocked) {
   block(SIGPIPE);
-  make_pipe(1);
-  close(ends.read());
-  EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Failure);
-  EXPECT_EQ(errno, EPIPE);
+  write_where_nobody_reads();
   EXPECT_FALSE(waits(SIGPIPE));
   EXPECT_TRUE(is_blocked(SIGPIPE));
 }
@@ -220,10 +218,7 @@ TEST_F(EventPipe, LeavesNoSignalToAProgramThatHasItBlocked) {
 TEST_F(EventPipe, LeavesASignalThatWaitedBefore) {
   block(SIGPIPE);
   raise(SIGPIPE);
-  make_pipe(1);
-  close(ends.read());
-  EXPECT_EQ(VEX_write_to_event_pipe(), Hb_Failure);
-  EXPECT_EQ(errno, EPIPE);
+  write_where_nobody_reads();
   EXPECT_TRUE(waits(SIGPIPE));
   EXPECT_TRUE(is_blocked(SIGPIPE));
 }
